@@ -1,0 +1,41 @@
+# Thin wrapper over CMake: `make run` and `make test` install what is missing, build, then run.
+BUILD ?= build
+CMAKE_FLAGS ?=
+CTEST_FLAGS ?= --output-on-failure
+
+.PHONY: all deps configure build run test bench format format-check fuzz-smoke clean
+
+all: build
+
+deps:
+	@tools/install-deps.sh
+	@if [ -f package.json ]; then tools/install-ruffle.sh; fi
+
+$(BUILD)/build.ninja:
+	cmake -S . -B $(BUILD) -G Ninja $(CMAKE_FLAGS)
+
+configure: $(BUILD)/build.ninja
+
+build: deps configure
+	cmake --build $(BUILD)
+
+run: build
+	$(BUILD)/bin/brimvault
+
+test: build
+	cd $(BUILD) && QT_QPA_PLATFORM=offscreen ctest $(CTEST_FLAGS)
+
+bench: build
+	@if [ -x tools/run-bench.sh ]; then tools/run-bench.sh $(BUILD); else echo "no benchmarks yet"; fi
+
+format: configure
+	cmake --build $(BUILD) --target format
+
+format-check: configure
+	cmake --build $(BUILD) --target format-check
+
+fuzz-smoke: deps
+	@if [ -x tools/fuzz-smoke.sh ]; then tools/fuzz-smoke.sh; else echo "no fuzz targets yet"; fi
+
+clean:
+	rm -rf $(BUILD)

@@ -1,0 +1,233 @@
+#include "store/IniDocument.h"
+
+#include <QStringDecoder>
+
+namespace Brimvault {
+
+namespace {
+
+    // Escapes keep every value on one line and keep a key's "=" and a section's "]" apart from the syntax.
+    QString escape(const QString& text, QChar special)
+    {
+        QString out;
+        out.reserve(text.size());
+        for (QChar c : text) {
+            if (c == u'\\')
+                out += u"\\\\";
+            else if (c == u'\r')
+                out += u"\\r";
+            else if (c == u'\n')
+                out += u"\\n";
+            else if (c == u'\0')
+                out += u"\\0";
+            else if (!special.isNull() && c == special)
+                out += QString(u'\\') + c;
+            else
+                out += c;
+        }
+        return out;
+    }
+
+    QString unescape(QStringView text)
+    {
+        QString out;
+        out.reserve(text.size());
+        for (qsizetype i = 0; i < text.size(); ++i) {
+            QChar c = text[i];
+            if (c != u'\\' || i + 1 == text.size()) {
+                out += c;
+                continue;
+            }
+            QChar n = text[++i];
+            if (n == u'r')
+                out += u'\r';
+            else if (n == u'n')
+                out += u'\n';
+            else if (n == u'0')
+                out += QChar(u'\0');
+            else
+                out += n;
+        }
+        return out;
+    }
+
+    // Position of the first "=" that is not escaped, or -1.
+    qsizetype findUnescapedEquals(QStringView text)
+    {
+        for (qsizetype i = 0; i < text.size(); ++i) {
+            if (text[i] == u'\\')
+                ++i;
+            else if (text[i] == u'=')
+                return i;
+        }
+        return -1;
+    }
+
+    bool sameName(const QString& a, const QString& b) { return a.compare(b, Qt::CaseInsensitive) == 0; }
+
+} // namespace
+
+IniDocument IniDocument::parse(const QByteArray& bytes)
+{
+    IniDocument doc;
+    qsizetype start = 0;
+    while (start < bytes.size()) {
+        qsizetype end = bytes.indexOf('\n', start);
+        if (end < 0)
+            end = bytes.size();
+        QByteArray rawLine = bytes.mid(start, end - start);
+        start = end + 1;
+        if (rawLine.endsWith('\r'))
+            rawLine.chop(1);
+
+        Line line;
+        line.raw = rawLine;
+        QStringDecoder decoder(QStringDecoder::Utf8);
+        const QString text = decoder.decode(rawLine);
+        if (decoder.hasError() || text.contains(QChar(u'\0'))) {
+            doc.m_lines.push_back(std::move(line));
+            continue;
+        }
+        if (text.startsWith(u'[') && text.endsWith(u']') && text.size() >= 2) {
+            line.kind = Line::Section;
+            line.name = unescape(QStringView(text).mid(1, text.size() - 2));
+        } else if (!text.startsWith(u';') && !text.startsWith(u'#')) {
+            const qsizetype eq = findUnescapedEquals(text);
+            if (eq > 0) {
+                line.kind = Line::Entry;
+                line.name = unescape(QStringView(text).left(eq));
+                line.value = unescape(QStringView(text).mid(eq + 1));
+            }
+        }
+        doc.m_lines.push_back(std::move(line));
+    }
+    return doc;
+}
+
+QByteArray IniDocument::serialize() const
+{
+    QByteArray out;
+    for (const Line& line : m_lines) {
+        switch (line.kind) {
+        case Line::Section:
+            out += '[' + escape(line.name, u']').toUtf8() + ']';
+            break;
+        case Line::Entry:
+            out += escape(line.name, u'=').toUtf8() + '=' + escape(line.value, QChar()).toUtf8();
+            break;
+        case Line::Raw:
+            out += line.raw;
+            break;
+        }
+        out += '\n';
+    }
+    return out;
+}
+
+qsizetype IniDocument::findSection(const QString& section) const
+{
+    for (size_t i = 0; i < m_lines.size(); ++i) {
+        if (m_lines[i].kind == Line::Section && sameName(m_lines[i].name, section))
+            return qsizetype(i);
+    }
+    return -1;
+}
+
+qsizetype IniDocument::sectionEnd(qsizetype sectionLine) const
+{
+    size_t i = size_t(sectionLine) + 1;
+    while (i < m_lines.size() && m_lines[i].kind != Line::Section)
+        ++i;
+    return qsizetype(i);
+}
+
+std::optional<QString> IniDocument::value(const QString& section, const QString& key) const
+{
+    const qsizetype s = findSection(section);
+    if (s < 0)
+        return std::nullopt;
+    const qsizetype end = sectionEnd(s);
+    for (qsizetype i = s + 1; i < end; ++i) {
+        const Line& line = m_lines[size_t(i)];
+        if (line.kind == Line::Entry && sameName(line.name, key))
+            return line.value;
+    }
+    return std::nullopt;
+}
+
+void IniDocument::setValue(const QString& section, const QString& key, const QString& value)
+{
+    qsizetype s = findSection(section);
+    if (s < 0) {
+        if (!m_lines.empty() && !(m_lines.back().kind == Line::Raw && m_lines.back().raw.isEmpty()))
+            m_lines.push_back(Line {});
+        m_lines.push_back(Line { Line::Section, section, {}, {} });
+        s = qsizetype(m_lines.size()) - 1;
+    }
+    const qsizetype end = sectionEnd(s);
+    qsizetype insertAt = end;
+    for (qsizetype i = s + 1; i < end; ++i) {
+        Line& line = m_lines[size_t(i)];
+        if (line.kind == Line::Entry && sameName(line.name, key)) {
+            line.value = value; // keep the stored spelling of the key
+            return;
+        }
+    }
+    // New entries go after the section's last entry, before any blank lines that separate it from the next one.
+    while (insertAt > s + 1 && m_lines[size_t(insertAt - 1)].kind == Line::Raw
+        && m_lines[size_t(insertAt - 1)].raw.trimmed().isEmpty())
+        --insertAt;
+    m_lines.insert(m_lines.begin() + insertAt, Line { Line::Entry, key, value, {} });
+}
+
+bool IniDocument::removeValue(const QString& section, const QString& key)
+{
+    bool removed = false;
+    for (qsizetype s = 0; s < qsizetype(m_lines.size()); ++s) {
+        if (m_lines[size_t(s)].kind != Line::Section || !sameName(m_lines[size_t(s)].name, section))
+            continue;
+        qsizetype end = sectionEnd(s);
+        for (qsizetype i = s + 1; i < end;) {
+            const Line& line = m_lines[size_t(i)];
+            if (line.kind == Line::Entry && sameName(line.name, key)) {
+                m_lines.erase(m_lines.begin() + i);
+                --end;
+                removed = true;
+            } else {
+                ++i;
+            }
+        }
+    }
+    return removed;
+}
+
+bool IniDocument::removeSection(const QString& section)
+{
+    bool removed = false;
+    for (qsizetype s = 0; s < qsizetype(m_lines.size());) {
+        if (m_lines[size_t(s)].kind == Line::Section && sameName(m_lines[size_t(s)].name, section)) {
+            m_lines.erase(m_lines.begin() + s, m_lines.begin() + sectionEnd(s));
+            removed = true;
+        } else {
+            ++s;
+        }
+    }
+    return removed;
+}
+
+QList<QPair<QString, QString>> IniDocument::sectionPairs(const QString& section) const
+{
+    QList<QPair<QString, QString>> pairs;
+    const qsizetype s = findSection(section);
+    if (s < 0)
+        return pairs;
+    const qsizetype end = sectionEnd(s);
+    for (qsizetype i = s + 1; i < end; ++i) {
+        const Line& line = m_lines[size_t(i)];
+        if (line.kind == Line::Entry)
+            pairs.append({ line.name, line.value });
+    }
+    return pairs;
+}
+
+} // namespace Brimvault

@@ -1,0 +1,41 @@
+#pragma once
+
+#include <QByteArray>
+#include <QList>
+#include <QPair>
+#include <QString>
+#include <optional>
+#include <vector>
+
+namespace Brimvault {
+
+// One settings file held as its lines. Lines that do not parse (hand edits, garbage, another encoding)
+// are kept byte for byte and written back unchanged, so a damaged file never loses what it held.
+class IniDocument {
+public:
+    static IniDocument parse(const QByteArray& bytes);
+    QByteArray serialize() const;
+
+    // Section and key names match without regard to letter case; the first match wins.
+    std::optional<QString> value(const QString& section, const QString& key) const;
+    void setValue(const QString& section, const QString& key, const QString& value);
+    bool removeValue(const QString& section, const QString& key);
+    bool removeSection(const QString& section);
+    QList<QPair<QString, QString>> sectionPairs(const QString& section) const;
+
+private:
+    struct Line {
+        enum Kind { Section, Entry, Raw } kind = Raw;
+        QString name; // section name for Section lines, key for Entry lines
+        QString value;
+        QByteArray raw; // the original bytes of a Raw line
+    };
+
+    // Index of the section line, or -1.
+    qsizetype findSection(const QString& section) const;
+    qsizetype sectionEnd(qsizetype sectionLine) const;
+
+    std::vector<Line> m_lines;
+};
+
+} // namespace Brimvault

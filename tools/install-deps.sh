@@ -1,0 +1,25 @@
+#!/usr/bin/env bash
+# Installs what building, running and testing Brimvault needs on Debian 12, and only what is missing.
+set -euo pipefail
+
+packages=(
+    cmake ninja-build g++ pkg-config
+    qt6-base-dev qt6-webengine-dev libqt6webenginecore6-bin qt6-image-formats-plugins libgl-dev
+    libarchive-dev xvfb xauth
+    mingw-w64 icoutils python3-pefile
+    clang libclang-rt-14-dev clang-format
+    nodejs npm
+)
+
+missing=()
+for p in "${packages[@]}"; do
+    dpkg-query -W -f='${Status}' "$p" 2>/dev/null | grep -q 'install ok installed' || missing+=("$p")
+done
+
+if ((${#missing[@]})); then
+    sudo=""
+    [ "$(id -u)" -eq 0 ] || sudo="sudo"
+    echo "Installing: ${missing[*]}"
+    $sudo apt-get update -qq
+    DEBIAN_FRONTEND=noninteractive $sudo apt-get install -y -qq --no-install-recommends "${missing[@]}"
+fi
