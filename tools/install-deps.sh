@@ -8,7 +8,6 @@ packages=(
     libarchive-dev xvfb xauth
     mingw-w64 icoutils python3-pefile
     clang libclang-rt-14-dev clang-format
-    nodejs npm
 )
 
 missing=()

@@ -6,64 +6,67 @@ namespace Brimvault {
 
 namespace {
 
-    // Escapes keep every value on one line and keep a key's "=" and a section's "]" apart from the syntax.
-    QString escape(const QString& text, QChar special)
-    {
-        QString out;
-        out.reserve(text.size());
-        for (QChar c : text) {
-            if (c == u'\\')
-                out += u"\\\\";
-            else if (c == u'\r')
-                out += u"\\r";
-            else if (c == u'\n')
-                out += u"\\n";
-            else if (c == u'\0')
-                out += u"\\0";
-            else if (!special.isNull() && c == special)
-                out += QString(u'\\') + c;
-            else
-                out += c;
-        }
-        return out;
+// Escapes keep every value on one line and keep a key's "=" and a section's "]" apart from the syntax.
+QString escape(const QString& text, QChar special)
+{
+    QString out;
+    out.reserve(text.size());
+    for (QChar c : text) {
+        if (c == u'\\')
+            out += u"\\\\";
+        else if (c == u'\r')
+            out += u"\\r";
+        else if (c == u'\n')
+            out += u"\\n";
+        else if (c == u'\0')
+            out += u"\\0";
+        else if (!special.isNull() && c == special)
+            out += QString(u'\\') + c;
+        else
+            out += c;
     }
+    return out;
+}
 
-    QString unescape(QStringView text)
-    {
-        QString out;
-        out.reserve(text.size());
-        for (qsizetype i = 0; i < text.size(); ++i) {
-            QChar c = text[i];
-            if (c != u'\\' || i + 1 == text.size()) {
-                out += c;
-                continue;
-            }
-            QChar n = text[++i];
-            if (n == u'r')
-                out += u'\r';
-            else if (n == u'n')
-                out += u'\n';
-            else if (n == u'0')
-                out += QChar(u'\0');
-            else
-                out += n;
+QString unescape(QStringView text)
+{
+    QString out;
+    out.reserve(text.size());
+    for (qsizetype i = 0; i < text.size(); ++i) {
+        QChar c = text[i];
+        if (c != u'\\' || i + 1 == text.size()) {
+            out += c;
+            continue;
         }
-        return out;
+        QChar n = text[++i];
+        if (n == u'r')
+            out += u'\r';
+        else if (n == u'n')
+            out += u'\n';
+        else if (n == u'0')
+            out += QChar(u'\0');
+        else
+            out += n;
     }
+    return out;
+}
 
-    // Position of the first "=" that is not escaped, or -1.
-    qsizetype findUnescapedEquals(QStringView text)
-    {
-        for (qsizetype i = 0; i < text.size(); ++i) {
-            if (text[i] == u'\\')
-                ++i;
-            else if (text[i] == u'=')
-                return i;
-        }
-        return -1;
+// Position of the first "=" that is not escaped, or -1.
+qsizetype findUnescapedEquals(QStringView text)
+{
+    for (qsizetype i = 0; i < text.size(); ++i) {
+        if (text[i] == u'\\')
+            ++i;
+        else if (text[i] == u'=')
+            return i;
     }
+    return -1;
+}
 
-    bool sameName(const QString& a, const QString& b) { return a.compare(b, Qt::CaseInsensitive) == 0; }
+bool sameName(const QString& a, const QString& b)
+{
+    return a.compare(b, Qt::CaseInsensitive) == 0;
+}
 
 } // namespace
 
@@ -73,24 +76,29 @@ IniDocument IniDocument::parse(const QByteArray& bytes)
     qsizetype start = 0;
     while (start < bytes.size()) {
         qsizetype end = bytes.indexOf('\n', start);
-        if (end < 0)
-            end = bytes.size();
-        QByteArray rawLine = bytes.mid(start, end - start);
-        start = end + 1;
-        if (rawLine.endsWith('\r'))
-            rawLine.chop(1);
-
+        end = end < 0 ? bytes.size() : end + 1;
         Line line;
-        line.raw = rawLine;
-        QStringDecoder decoder(QStringDecoder::Utf8);
-        const QString text = decoder.decode(rawLine);
+        line.raw = bytes.mid(start, end - start);
+        start = end;
+
+        QByteArray content = line.raw;
+        if (content.endsWith('\n'))
+            content.chop(1);
+        if (content.endsWith('\r'))
+            content.chop(1);
+        if (doc.m_lines.empty() && line.raw.endsWith("\r\n"))
+            doc.m_lineEnd = "\r\n";
+        // The decoder drops a byte order mark at the start of the file.
+        QStringDecoder decoder(QStringDecoder::Utf8, QStringDecoder::Flag::Stateless);
+        const QString text = decoder.decode(content);
         if (decoder.hasError() || text.contains(QChar(u'\0'))) {
             doc.m_lines.push_back(std::move(line));
             continue;
         }
-        if (text.startsWith(u'[') && text.endsWith(u']') && text.size() >= 2) {
+        const QString trimmed = text.trimmed();
+        if (trimmed.startsWith(u'[') && trimmed.endsWith(u']') && trimmed.size() >= 2) {
             line.kind = Line::Section;
-            line.name = unescape(QStringView(text).mid(1, text.size() - 2));
+            line.name = unescape(QStringView(trimmed).mid(1, trimmed.size() - 2));
         } else if (!text.startsWith(u';') && !text.startsWith(u'#')) {
             const qsizetype eq = findUnescapedEquals(text);
             if (eq > 0) {
@@ -104,22 +112,32 @@ IniDocument IniDocument::parse(const QByteArray& bytes)
     return doc;
 }
 
+// Lines nobody changed are written back byte for byte, so hand edits, other encodings and damaged lines
+// survive every write.
 QByteArray IniDocument::serialize() const
 {
     QByteArray out;
-    for (const Line& line : m_lines) {
-        switch (line.kind) {
-        case Line::Section:
-            out += '[' + escape(line.name, u']').toUtf8() + ']';
-            break;
-        case Line::Entry:
-            out += escape(line.name, u'=').toUtf8() + '=' + escape(line.value, QChar()).toUtf8();
-            break;
-        case Line::Raw:
+    for (size_t i = 0; i < m_lines.size(); ++i) {
+        const Line& line = m_lines[i];
+        if (!line.modified) {
             out += line.raw;
-            break;
+            if (!line.raw.endsWith('\n') && i + 1 < m_lines.size())
+                out += m_lineEnd;
+            continue;
         }
-        out += '\n';
+        if (line.kind == Line::Section) {
+            out += '[' + escape(line.name, u']').toUtf8() + ']';
+        } else {
+            QString key = escape(line.name, u'=');
+            // A key that would read as a comment or a section header keeps its first character escaped.
+            qsizetype first = 0;
+            while (first < key.size() && key[first].isSpace())
+                ++first;
+            if (first < key.size() && (key[first] == u';' || key[first] == u'#' || key[first] == u'['))
+                key.insert(first, u'\\');
+            out += key.toUtf8() + '=' + escape(line.value, QChar()).toUtf8();
+        }
+        out += m_lineEnd;
     }
     return out;
 }
@@ -159,9 +177,9 @@ void IniDocument::setValue(const QString& section, const QString& key, const QSt
 {
     qsizetype s = findSection(section);
     if (s < 0) {
-        if (!m_lines.empty() && !(m_lines.back().kind == Line::Raw && m_lines.back().raw.isEmpty()))
+        if (!m_lines.empty() && !(m_lines.back().kind == Line::Raw && m_lines.back().raw.trimmed().isEmpty()))
             m_lines.push_back(Line {});
-        m_lines.push_back(Line { Line::Section, section, {}, {} });
+        m_lines.push_back(Line {Line::Section, section, {}, {}, true});
         s = qsizetype(m_lines.size()) - 1;
     }
     const qsizetype end = sectionEnd(s);
@@ -169,7 +187,10 @@ void IniDocument::setValue(const QString& section, const QString& key, const QSt
     for (qsizetype i = s + 1; i < end; ++i) {
         Line& line = m_lines[size_t(i)];
         if (line.kind == Line::Entry && sameName(line.name, key)) {
-            line.value = value; // keep the stored spelling of the key
+            if (line.value != value) {
+                line.value = value; // keep the stored spelling of the key
+                line.modified = true;
+            }
             return;
         }
     }
@@ -177,7 +198,7 @@ void IniDocument::setValue(const QString& section, const QString& key, const QSt
     while (insertAt > s + 1 && m_lines[size_t(insertAt - 1)].kind == Line::Raw
         && m_lines[size_t(insertAt - 1)].raw.trimmed().isEmpty())
         --insertAt;
-    m_lines.insert(m_lines.begin() + insertAt, Line { Line::Entry, key, value, {} });
+    m_lines.insert(m_lines.begin() + insertAt, Line {Line::Entry, key, value, {}, true});
 }
 
 bool IniDocument::removeValue(const QString& section, const QString& key)
@@ -225,7 +246,7 @@ QList<QPair<QString, QString>> IniDocument::sectionPairs(const QString& section)
     for (qsizetype i = s + 1; i < end; ++i) {
         const Line& line = m_lines[size_t(i)];
         if (line.kind == Line::Entry)
-            pairs.append({ line.name, line.value });
+            pairs.append({line.name, line.value});
     }
     return pairs;
 }

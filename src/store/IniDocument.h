@@ -28,7 +28,8 @@ private:
         enum Kind { Section, Entry, Raw } kind = Raw;
         QString name; // section name for Section lines, key for Entry lines
         QString value;
-        QByteArray raw; // the original bytes of a Raw line
+        QByteArray raw; // the line as read, with its line end if it had one
+        bool modified = false; // Section and Entry lines that are new or changed are written from name and value
     };
 
     // Index of the section line, or -1.
@@ -36,6 +37,7 @@ private:
     qsizetype sectionEnd(qsizetype sectionLine) const;
 
     std::vector<Line> m_lines;
+    QByteArray m_lineEnd = "\n"; // for new lines: the line end of the file's first line
 };
 
 } // namespace Brimvault

@@ -13,10 +13,6 @@
 
 #include <functional>
 
-#ifdef Q_OS_UNIX
-#include <sys/stat.h>
-#endif
-
 namespace Brimvault {
 
 QString AppTitle()
@@ -41,11 +37,11 @@ QString SettingsFilePath(const QString& appName)
 
 // The registry is case-insensitive and live by nature: QSettings over it is all we need.
 namespace {
-    QSettings registryFor(const QString& appName)
-    {
-        return QSettings(QStringLiteral("HKEY_CURRENT_USER\\Software\\VB and VBA Program Settings\\") + appName,
-            QSettings::NativeFormat);
-    }
+QSettings registryFor(const QString& appName)
+{
+    return QSettings(QStringLiteral("HKEY_CURRENT_USER\\Software\\VB and VBA Program Settings\\") + appName,
+        QSettings::NativeFormat);
+}
 } // namespace
 
 QString GetSetting(const QString& appName, const QString& section, const QString& key, const QString& defaultValue)
@@ -84,7 +80,7 @@ QList<QPair<QString, QString>> GetAllSettings(const QString& appName, const QStr
     s.beginGroup(section);
     QList<QPair<QString, QString>> pairs;
     for (const QString& key : s.childKeys())
-        pairs.append({ key, s.value(key).toString() });
+        pairs.append({key, s.value(key).toString()});
     return pairs;
 }
 
@@ -92,95 +88,84 @@ QList<QPair<QString, QString>> GetAllSettings(const QString& appName, const QStr
 
 namespace {
 
-    // Identifies one version of the file. Writers replace the file by rename, so the inode changes on
-    // every write even when the size and the time stamp's resolution would not tell.
-    struct FileStamp {
-        bool exists = false;
-        qint64 inode = 0;
-        qint64 size = 0;
-        qint64 mtimeNs = 0;
-        bool operator==(const FileStamp&) const = default;
-    };
+// The parsed form of the bytes last seen. Every read looks at the file itself, because another process
+// (the service) may have replaced it in the meantime; only the parsing is saved when nothing changed.
+// File stamps cannot tell: a same-size rewrite within the clock's tick may even reuse the inode.
+struct CachedFile {
+    QByteArray bytes;
+    IniDocument doc;
+};
 
-    FileStamp stampOf(const QString& path)
-    {
-        struct stat st {};
-        if (::stat(QFile::encodeName(path).constData(), &st) != 0)
-            return {};
-        return { true, qint64(st.st_ino), qint64(st.st_size), qint64(st.st_mtim.tv_sec) * 1000000000 + st.st_mtim.tv_nsec };
-    }
+QMutex cacheMutex;
+QHash<QString, CachedFile>& cache()
+{
+    static QHash<QString, CachedFile> files;
+    return files;
+}
 
-    struct CachedFile {
-        FileStamp stamp;
-        IniDocument doc;
-    };
+enum class ReadState { Missing, Read, Unreadable };
 
-    QMutex cacheMutex;
-    QHash<QString, CachedFile>& cache()
-    {
-        static QHash<QString, CachedFile> files;
-        return files;
-    }
+ReadState readBytes(const QString& path, QByteArray& bytes)
+{
+    QFile file(path);
+    if (!file.exists())
+        return ReadState::Missing;
+    if (!file.open(QIODevice::ReadOnly))
+        return ReadState::Unreadable;
+    bytes = file.readAll();
+    return file.error() == QFileDevice::NoError ? ReadState::Read : ReadState::Unreadable;
+}
 
-    enum class ReadState { Missing, Read, Unreadable };
+IniDocument parsedDocument(const QString& path, const QByteArray& bytes)
+{
+    QMutexLocker lock(&cacheMutex);
+    auto it = cache().find(path);
+    if (it != cache().end() && it->bytes == bytes)
+        return it->doc;
+    IniDocument doc = IniDocument::parse(bytes);
+    cache().insert(path, {bytes, doc});
+    return doc;
+}
 
-    ReadState readDocument(const QString& path, IniDocument& doc)
-    {
-        QFile file(path);
-        if (!file.exists())
-            return ReadState::Missing;
-        if (!file.open(QIODevice::ReadOnly))
-            return ReadState::Unreadable;
-        doc = IniDocument::parse(file.readAll());
-        return ReadState::Read;
-    }
+IniDocument currentDocument(const QString& path)
+{
+    QByteArray bytes;
+    if (readBytes(path, bytes) != ReadState::Read)
+        return {};
+    return parsedDocument(path, bytes);
+}
 
-    // The current content of the file, re-read only when it changed since the last look.
-    IniDocument currentDocument(const QString& path)
-    {
-        QMutexLocker lock(&cacheMutex);
-        const FileStamp stamp = stampOf(path);
-        auto it = cache().find(path);
-        if (it != cache().end() && it->stamp == stamp && stamp.exists)
-            return it->doc;
-        IniDocument doc;
-        if (readDocument(path, doc) != ReadState::Read) {
-            cache().remove(path);
-            return {};
-        }
-        cache().insert(path, { stamp, doc });
-        return doc;
-    }
+// Read, change and write back under a lock file, so that two processes writing at once both keep their
+// change. A file that exists but cannot be read is never overwritten.
+bool modifyDocument(const QString& appName, const std::function<bool(IniDocument&)>& change)
+{
+    const QString path = SettingsFilePath(appName);
+    if (!QDir().mkpath(QFileInfo(path).absolutePath()))
+        return false;
+    QLockFile lock(path + QStringLiteral(".lock"));
+    lock.setStaleLockTime(10000);
+    if (!lock.tryLock(10000))
+        return false;
 
-    // Read, change and write back under a lock file, so that two processes writing at once both keep their
-    // change. A file that exists but cannot be read is never overwritten.
-    bool modifyDocument(const QString& appName, const std::function<bool(IniDocument&)>& change)
-    {
-        const QString path = SettingsFilePath(appName);
-        if (!QDir().mkpath(QFileInfo(path).absolutePath()))
-            return false;
-        QLockFile lock(path + QStringLiteral(".lock"));
-        lock.setStaleLockTime(10000);
-        if (!lock.tryLock(10000))
-            return false;
-
-        IniDocument doc;
-        if (readDocument(path, doc) == ReadState::Unreadable)
-            return false;
-        if (!change(doc))
-            return true;
-
-        QSaveFile out(path);
-        if (!out.open(QIODevice::WriteOnly))
-            return false;
-        out.write(doc.serialize());
-        if (!out.commit())
-            return false;
-
-        QMutexLocker cacheLock(&cacheMutex);
-        cache().insert(path, { stampOf(path), doc });
+    QByteArray bytes;
+    if (readBytes(path, bytes) == ReadState::Unreadable)
+        return false;
+    IniDocument doc = parsedDocument(path, bytes);
+    if (!change(doc))
         return true;
-    }
+
+    const QByteArray changed = doc.serialize();
+    QSaveFile out(path);
+    if (!out.open(QIODevice::WriteOnly))
+        return false;
+    out.write(changed);
+    if (!out.commit())
+        return false;
+
+    QMutexLocker cacheLock(&cacheMutex);
+    cache().insert(path, {changed, doc});
+    return true;
+}
 
 } // namespace
 

@@ -12,8 +12,8 @@ QString AppTitle();
 // The per-user settings store: application name, section and key address a text value. Keys and sections
 // match without regard to letter case. Reads always see what another process has written meanwhile.
 // Elsewhere than on Windows the store is one INI file per application name in SettingsDirectory().
-QString GetSetting(const QString& appName, const QString& section, const QString& key,
-    const QString& defaultValue = QString());
+QString GetSetting(
+    const QString& appName, const QString& section, const QString& key, const QString& defaultValue = QString());
 bool SaveSetting(const QString& appName, const QString& section, const QString& key, const QString& value);
 bool DeleteSetting(const QString& appName, const QString& section, const QString& key);
 bool DeleteSection(const QString& appName, const QString& section);

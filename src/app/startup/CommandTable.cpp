@@ -1,0 +1,53 @@
+// The commands of the program's command line. A new command adds one entry here and its function in its
+// own subsystem.
+#include "app/startup/CommandLine.h"
+
+#include "icons/IconCommands.h"
+#include "store/SettingsStore.h"
+
+#include <QTextStream>
+
+namespace Brimvault::CommandLine {
+
+namespace {
+
+int printUsage(const QStringList&)
+{
+    QTextStream(stdout) << Usage();
+    return 0;
+}
+
+int printVersion(const QStringList&)
+{
+    QTextStream(stdout) << AppTitle() << ' ' << QStringLiteral(BRIMVAULT_VERSION) << '\n';
+    return 0;
+}
+
+int extractIcon(const QStringList& arguments)
+{
+    QTextStream err(stderr);
+    return IconCommands::ExtractIcon(arguments.at(0), arguments.at(1), err);
+}
+
+int versionInfo(const QStringList& arguments)
+{
+    QTextStream out(stdout);
+    QTextStream err(stderr);
+    return IconCommands::PrintVersionInfo(arguments.at(0), out, err);
+}
+
+} // namespace
+
+QList<Command> Commands()
+{
+    return {
+        {QStringLiteral("--help"), QString(), QStringLiteral("show this help"), 0, 0, printUsage},
+        {QStringLiteral("--version"), QString(), QStringLiteral("show the program's version"), 0, 0, printVersion},
+        {QStringLiteral("--extract-icon"), QStringLiteral("FILE OUT.ico"),
+            QStringLiteral("write the main icon of an executable as an icon file"), 2, 2, extractIcon},
+        {QStringLiteral("--version-info"), QStringLiteral("FILE"),
+            QStringLiteral("print the version information of an executable"), 1, 1, versionInfo},
+    };
+}
+
+} // namespace Brimvault::CommandLine

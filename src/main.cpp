@@ -1,0 +1,33 @@
+#include "app/startup/CommandLine.h"
+#include "app/startup/WidgetPrompts.h"
+#include "app/startup/modMain.h"
+#include "store/SettingsStore.h"
+
+#include <QApplication>
+#include <QWidget>
+
+#include <algorithm>
+
+int main(int argc, char* argv[])
+{
+    using namespace Brimvault;
+
+    if (CommandLine::NeedsNoDisplay(argc, argv) && qEnvironmentVariableIsEmpty("QT_QPA_PLATFORM"))
+        qputenv("QT_QPA_PLATFORM", "offscreen");
+
+    QApplication app(argc, argv);
+    QApplication::setApplicationName(AppTitle());
+    QApplication::setApplicationVersion(QStringLiteral(BRIMVAULT_VERSION));
+
+    if (const std::optional<int> exitCode = CommandLine::Dispatch(QApplication::arguments().mid(1)))
+        return *exitCode;
+
+    InstallWidgetPrompts();
+    modMain::Main();
+
+    // Main has shown the main window, or has told the user why it cannot and there is nothing to run.
+    const QWidgetList windows = QApplication::topLevelWidgets();
+    const bool windowShown
+        = std::any_of(windows.cbegin(), windows.cend(), [](const QWidget* window) { return window->isVisible(); });
+    return windowShown ? app.exec() : 1;
+}

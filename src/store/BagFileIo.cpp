@@ -1,0 +1,77 @@
+#include "store/BagFileIo.h"
+
+#include <QDir>
+#include <QFile>
+#include <QFileInfo>
+#include <QSaveFile>
+#include <QStringDecoder>
+#include <QStringEncoder>
+
+namespace Brimvault::BagFileIo {
+
+QString fileSystemPath(const QString& fileName)
+{
+#ifdef Q_OS_WIN
+    return QDir::fromNativeSeparators(fileName);
+#else
+    QString path = fileName;
+    path.replace(u'\\', u'/');
+    return path;
+#endif
+}
+
+bool isFile(const QString& fileName)
+{
+    return QFileInfo(fileSystemPath(fileName)).isFile();
+}
+
+ReadResult readText(const QString& fileName)
+{
+    const QFileInfo info(fileSystemPath(fileName));
+    if (!info.exists())
+        return {};
+    if (!info.isFile() || info.size() > MaximumFileSize)
+        return {ReadStatus::Unreadable, {}};
+    QFile file(info.filePath());
+    if (!file.open(QIODevice::ReadOnly))
+        return {ReadStatus::Unreadable, {}};
+    const QByteArray bytes = file.read(MaximumFileSize + 1);
+    if (file.error() != QFileDevice::NoError || bytes.size() > MaximumFileSize)
+        return {ReadStatus::Unreadable, {}};
+    QStringDecoder decoder(QStringConverter::System, QStringConverter::Flag::Stateless);
+    return {ReadStatus::Read, decoder.decode(bytes)};
+}
+
+bool writeText(const QString& fileName, const QString& text)
+{
+    QStringEncoder encoder(QStringConverter::System);
+    const QByteArray bytes = encoder.encode(text);
+    QSaveFile file(fileSystemPath(fileName));
+    if (!file.open(QIODevice::WriteOnly))
+        return false;
+    file.write(bytes);
+    return file.commit();
+}
+
+bool removeFile(const QString& fileName)
+{
+    const QFileInfo info(fileSystemPath(fileName));
+    if (!info.exists() && !info.isSymLink())
+        return true;
+    if (info.isDir())
+        return false;
+    return QFile::remove(info.filePath());
+}
+
+void createParentFolder(const QString& fileName)
+{
+    const QString path = fileSystemPath(fileName);
+    const qsizetype separator = path.lastIndexOf(u'/');
+    if (separator <= 0)
+        return;
+    const QString folder = path.left(separator);
+    if (!QFileInfo::exists(folder))
+        QDir().mkdir(folder);
+}
+
+} // namespace Brimvault::BagFileIo

@@ -1,0 +1,44 @@
+#pragma once
+
+#include <QList>
+#include <QString>
+#include <optional>
+
+namespace Brimvault::CatalogueStore {
+
+// The games the user added by hand: settings section "Files", one "File" + n value per game, n given out
+// from "Count" and never reused, so the section may have gaps.
+
+struct AddedGame {
+    QString key; // as stored, e.g. "File3"
+    QString path;
+    // The n of "File" + n; 0 for a key that does not have that form.
+    int number() const;
+};
+
+// Every entry of the section in the store's order, without the counter.
+QList<AddedGame> AddedGames();
+
+// Gives out the next entry number, stores the path under it and returns its key.
+QString AddGame(const QString& path);
+
+// The entry whose path matches, ignoring letter case and surrounding blanks.
+std::optional<AddedGame> FindAddedGame(const QString& path);
+std::optional<AddedGame> FindAddedGame(const QList<AddedGame>& games, const QString& path);
+
+// Deletes the entry and the user's display name for it; the counter stays.
+void RemoveGame(const QString& fileKey);
+// Deletes the whole "Files" section; display names stay.
+void RemoveAllAddedGames();
+
+// "File3" -> "FileName3", the key of the display name in "FilesNames".
+QString DisplayNameKey(const QString& fileKey);
+QString DisplayName(const QString& fileKey);
+void SetDisplayName(const QString& fileKey, const QString& name);
+
+// The highest entry number given out so far.
+int EntryCount();
+
+bool SamePath(const QString& a, const QString& b);
+
+} // namespace Brimvault::CatalogueStore

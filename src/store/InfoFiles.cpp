@@ -1,0 +1,64 @@
+#include "store/InfoFiles.h"
+
+#include "store/BagFileIo.h"
+#include "store/CatalogueKeys.h"
+#include "store/clsFileBag.h"
+
+namespace Brimvault::InfoFiles {
+
+namespace {
+
+qsizetype lastSeparator(const QString& path)
+{
+    return qMax(path.lastIndexOf(u'\\'), path.lastIndexOf(u'/'));
+}
+
+// The value of the one-part record, trimmed; whitespace also covers a final line end written by an
+// editor that ends lines with LF only.
+QString recordValue(const clsFileBag& bag, const QString& part)
+{
+    return bag.GetValue(clsFileBag::MakeKey(part)).trimmed();
+}
+
+} // namespace
+
+QString GameInfoFileName(const QString& gamePath)
+{
+    const QString path = clsFileBag::LeftTo(gamePath, QStringLiteral("?"));
+    const qsizetype separator = lastSeparator(path);
+    const QString folder = separator < 0 ? QStringLiteral(".\\") : path.left(separator + 1);
+    const QString name = path.mid(separator + 1);
+    const qsizetype dot = name.lastIndexOf(u'.');
+    return folder + (dot < 0 ? name : name.left(dot)) + CatalogueKeys::InfoFileExtension;
+}
+
+QString GameInfoName(const QString& gamePath, const QString& lngNik)
+{
+    const QString infoFile = GameInfoFileName(gamePath);
+    if (!BagFileIo::isFile(infoFile))
+        return QString();
+    clsFileBag bag;
+    bag.OpenFile(infoFile);
+    const QString localised = recordValue(bag, CatalogueKeys::NameRecord + u'_' + lngNik);
+    return localised.isEmpty() ? recordValue(bag, CatalogueKeys::NameRecord) : localised;
+}
+
+QString DirInfoFileName(const QString& folder)
+{
+    if (folder.isEmpty() || folder.endsWith(u'/') || folder.endsWith(u'\\'))
+        return folder + CatalogueKeys::DirInfoFileName;
+    const QChar separator = folder.lastIndexOf(u'\\') > folder.lastIndexOf(u'/') ? u'\\' : u'/';
+    return folder + separator + CatalogueKeys::DirInfoFileName;
+}
+
+bool IsStopFolder(const QString& folder)
+{
+    const QString infoFile = DirInfoFileName(folder);
+    if (!BagFileIo::isFile(infoFile))
+        return false;
+    clsFileBag bag;
+    bag.OpenFile(infoFile);
+    return recordValue(bag, CatalogueKeys::StopDirRecord) == CatalogueKeys::StopDirYes;
+}
+
+} // namespace Brimvault::InfoFiles

@@ -1,0 +1,40 @@
+#include "ui/listview/IconFace.h"
+
+#include "ui/listview/ListConstants.h"
+
+#include <QPainter>
+
+namespace Brimvault {
+
+void IconFace::setPicture(const QPixmap& picture)
+{
+    m_picture = picture;
+    if (!picture.isNull())
+        m_shown = picture;
+}
+
+void IconFace::setBackColor(QRgb color)
+{
+    m_backColor = color;
+    m_shown = m_picture;
+}
+
+void IconFace::paint(QPainter& painter, const QPoint& origin) const
+{
+    const QRect surface(origin, QSize(ListGrid::IconSize, ListGrid::IconSize));
+    painter.fillRect(surface, QColor::fromRgb(m_backColor));
+    if (m_shown.isNull())
+        return;
+    const QSize logical = m_shown.deviceIndependentSize().toSize();
+    if (logical == surface.size()) {
+        painter.drawPixmap(origin, m_shown);
+        return;
+    }
+    // Pictures of another size are drawn at the standard icon size, as the system's icon call does.
+    painter.save();
+    painter.setRenderHint(QPainter::SmoothPixmapTransform);
+    painter.drawPixmap(surface, m_shown);
+    painter.restore();
+}
+
+} // namespace Brimvault

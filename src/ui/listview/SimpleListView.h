@@ -1,0 +1,149 @@
+#pragma once
+
+#include "ui/listview/CaptionWrapper.h"
+#include "ui/listview/ItemBands.h"
+#include "ui/listview/ListError.h"
+#include "ui/listview/ListModel.h"
+
+#include <QColor>
+#include <QVariantMap>
+#include <QWidget>
+
+class QMimeData;
+class QScrollBar;
+class QTimer;
+
+namespace Brimvault {
+
+class ListIcon;
+class ListCaption;
+
+// The scrolling grid of large icons with captions. Items are plain records painted by the list itself, so
+// a library of tens of thousands of games costs no more widgets than one of twenty, and scrolling moves
+// nothing but an offset. Each item's icon and caption stay observable through ListIcon and ListCaption.
+class SimpleListView : public QWidget {
+    Q_OBJECT
+    Q_PROPERTY(QColor BackColor READ BackColor WRITE SetBackColor)
+    Q_PROPERTY(int OLEDropMode READ OLEDropMode WRITE SetOLEDropMode)
+
+public:
+    explicit SimpleListView(QWidget* parent = nullptr);
+    ~SimpleListView() override;
+
+    void ArrangeConstituentControls();
+    bool Add(const QPixmap& Picture, const QString& Caption, const QString& Data);
+    qint16 AddEx(const QString& Caption, const QString& Data);
+    ListError RemoveCurrentItem();
+    void RemoveAll();
+    void InitSelection();
+    QString GetCurrentData() const;
+    QString GetCurrentCaption() const;
+    void SetCurrentCaption(const QString& Caption);
+    QColor BackColor() const;
+    void SetBackColor(const QColor& color);
+    QPaintDevice* hdc();
+    void Refresh();
+    void OLEDrag();
+    int OLEDropMode() const;
+    void SetOLEDropMode(int mode);
+
+    // Persisted properties: "BackColor" (0x00BBGGRR) and "OLEDropMode"; defaults are not written.
+    void ReadProperties(const QVariantMap& properties);
+    QVariantMap WriteProperties() const;
+
+    // The elements and the state behind them, for the host and for tests.
+    int loadedCount() const { return m_model.loadedCount(); }
+    ListIcon imgN(int index);
+    ListCaption labN(int index);
+    const ListLayoutState& layoutState() const { return m_state; }
+    int currentIndex() const { return m_frame.currentIndex(); }
+    QString selectionTag() const { return m_frame.tag; }
+    QRectF selectionFrameRect() const;
+    bool isSelectionFrameVisible() const { return m_frame.visible; }
+    QScrollBar* vbarWindow() const { return m_vbar; }
+    QTimer* Timer1() const { return m_timer; }
+
+Q_SIGNALS:
+    void EnterKey(QString& Data);
+    void OLECompleteDrag(qint32 Effect);
+    void OLEDragDrop(const QMimeData* Data, qint32& Effect, qint16 Button, qint16 Shift, float X, float Y);
+    void OLEDragOver(
+        const QMimeData* Data, qint32& Effect, qint16 Button, qint16 Shift, float X, float Y, qint16 State);
+    void OLEGiveFeedback(qint32 Effect, bool& DefaultCursors);
+    void OLESetData(QMimeData* Data, qint16 DataFormat);
+    void OLEStartDrag(QMimeData* Data, qint32& AllowedEffects);
+    void MouseDown(qint16 Button, qint16 Shift, float X, float Y);
+    void MouseMove(qint16 Button, qint16 Shift, float X, float Y);
+    void MouseUp(qint16 Button, qint16 Shift, float X, float Y);
+
+    // A persisted property was written; the host saves WriteProperties() when it keeps its settings.
+    void propertyChanged(const QString& name);
+
+protected:
+    void paintEvent(QPaintEvent* event) override;
+    void resizeEvent(QResizeEvent* event) override;
+    void showEvent(QShowEvent* event) override;
+    void changeEvent(QEvent* event) override;
+    void keyPressEvent(QKeyEvent* event) override;
+    void mousePressEvent(QMouseEvent* event) override;
+    void mouseMoveEvent(QMouseEvent* event) override;
+    void mouseReleaseEvent(QMouseEvent* event) override;
+    void mouseDoubleClickEvent(QMouseEvent* event) override;
+    void wheelEvent(QWheelEvent* event) override;
+    void dragEnterEvent(QDragEnterEvent* event) override;
+    void dragMoveEvent(QDragMoveEvent* event) override;
+    void dragLeaveEvent(QDragLeaveEvent* event) override;
+    void dropEvent(QDropEvent* event) override;
+
+private:
+    friend class ListIcon;
+    friend class ListCaption;
+
+    struct Hit {
+        int index = -1;
+        bool onIcon = false;
+        QPointF origin;
+    };
+
+    // Items
+    bool addItem(const QPixmap* picture, const QString& caption, const QString& dataString);
+    void clearItems();
+    void setCaptionText(ListItem& item, const QString& text);
+    QRectF shownIconRect(const ListItem& item) const;
+    QRectF shownCaptionRect(const ListItem& item) const;
+    void updateItem(int index);
+
+    // Layout and scrolling
+    double usableWidth() const;
+    void arrangeItems();
+    void updateScrollRange();
+    void scrollContents(int value);
+    void onScrollValueChanged(int value);
+    void onSliderMoved(int position);
+    QRect itemArea() const;
+    const std::vector<int>& itemsNear(double shownTop, double shownBottom) const;
+
+    // Selection and input
+    ListError selectItem(int index);
+    void onHighlightTimeout();
+    void moveByArrow(int keyCode);
+    void keepFrameInView();
+    Hit hitTest(const QPointF& point) const;
+    qint16 shiftState(Qt::KeyboardModifiers modifiers) const;
+    void handleDrag(QDropEvent* event, qint16 state);
+
+    ListModel m_model;
+    ListLayoutState m_state;
+    SelectionFrame m_frame;
+    CaptionWrapper m_wrapper;
+    mutable ItemBands m_bands;
+    mutable std::vector<int> m_nearby;
+    QScrollBar* m_vbar = nullptr;
+    QTimer* m_timer = nullptr;
+    QColor m_backColor;
+    int m_oleDropMode = 0;
+    Hit m_capture;
+    int m_wheelRemainder = 0;
+};
+
+} // namespace Brimvault

@@ -1,0 +1,29 @@
+#include "ListTestIcons.h"
+
+#include <QLinearGradient>
+#include <QPainter>
+#include <QPainterPath>
+
+QPixmap makeTestIcon(const QColor& color, QChar letter)
+{
+    QImage image(32, 32, QImage::Format_ARGB32_Premultiplied);
+    image.fill(Qt::transparent);
+    QPainter painter(&image);
+    painter.setRenderHint(QPainter::Antialiasing);
+    QLinearGradient gradient(0, 2, 0, 30);
+    gradient.setColorAt(0, color.lighter(140));
+    gradient.setColorAt(1, color.darker(130));
+    QPainterPath path;
+    path.addRoundedRect(QRectF(2.5, 2.5, 27, 27), 6, 6);
+    painter.fillPath(path, gradient);
+    painter.setPen(QPen(color.darker(180), 1));
+    painter.drawPath(path);
+    QFont font = painter.font();
+    font.setBold(true);
+    font.setPixelSize(17);
+    painter.setFont(font);
+    painter.setPen(Qt::white);
+    painter.drawText(QRect(2, 2, 28, 28), Qt::AlignCenter, QString(letter));
+    painter.end();
+    return QPixmap::fromImage(image);
+}

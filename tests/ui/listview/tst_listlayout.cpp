@@ -1,0 +1,348 @@
+#include "ui/listview/CaptionWrapper.h"
+#include "ui/listview/GridLayout.h"
+#include "ui/listview/KeyNavigation.h"
+#include "ui/listview/ListModel.h"
+#include "ui/listview/RowSnapping.h"
+
+#include "TestEnvironment.h"
+
+#include <QFontMetricsF>
+#include <QGuiApplication>
+#include <QTest>
+
+using namespace Brimvault;
+
+namespace {
+
+// A model of count elements with the given caption heights (cycled), as the list would hold them.
+ListModel modelWithCaptions(int count, const QList<int>& heights)
+{
+    ListModel model;
+    for (int i = 0; i < count; ++i) {
+        ListItem& item = i == 0 ? model.at(0) : model.load();
+        item.captionHeight = heights.at(i % heights.size());
+        item.iconVisible = item.captionVisible = true;
+    }
+    return model;
+}
+
+} // namespace
+
+class TestListLayout : public QObject {
+    Q_OBJECT
+
+private Q_SLOTS:
+    void initTestCase() { m_font = QFont(QStringLiteral("DejaVu Sans"), 9); }
+
+    void roundedIntDiv_data()
+    {
+        QTest::addColumn<double>("dividend");
+        QTest::addColumn<double>("divisor");
+        QTest::addColumn<long long>("quotient");
+        QTest::newRow("icon offset") << 48.0 << 2.0 << 24LL;
+        QTest::newRow("caption offset") << 16.0 << 2.0 << 8LL;
+        QTest::newRow("half rounds to even down") << 2.5 << 1.0 << 2LL;
+        QTest::newRow("half rounds to even up") << 3.5 << 1.0 << 4LL;
+        QTest::newRow("truncates towards zero") << -7.0 << 2.0 << -3LL;
+        QTest::newRow("odd width") << 47.0 << 2.0 << 23LL;
+    }
+    void roundedIntDiv()
+    {
+        QFETCH(double, dividend);
+        QFETCH(double, divisor);
+        QFETCH(long long, quotient);
+        QCOMPARE(GridLayout::roundedIntDiv(dividend, divisor), quotient);
+    }
+
+    void captionLinesFitAndAreGreedy_data()
+    {
+        QTest::addColumn<QString>("caption");
+        QTest::newRow("one word") << QStringLiteral("Chess");
+        QTest::newRow("three words") << QStringLiteral("Solitaire Collection Deluxe");
+        QTest::newRow("long word") << QStringLiteral("Supercalifragilisticexpialidocious");
+        QTest::newRow("blanks between") << QStringLiteral("Mah   Jongg  Quest of the Dragon");
+        QTest::newRow("cyrillic") << QStringLiteral("Косынка и другие пасьянсы");
+        QTest::newRow("inserted blanks") << QStringLiteral("Superlongnam egamewithoutb lanks...");
+    }
+    void captionLinesFitAndAreGreedy()
+    {
+        QFETCH(QString, caption);
+        CaptionWrapper wrapper(m_font);
+        QFontMetricsF metrics(m_font);
+        const QList<CaptionWrapper::Line> lines = wrapper.wrap(caption, 64);
+        QVERIFY(!lines.isEmpty());
+        QString words;
+        for (int i = 0; i < lines.size(); ++i) {
+            const QString text = caption.mid(lines[i].start, lines[i].length);
+            // Every line fits as it is drawn, except a single character wider than a line.
+            if (text.size() > 1)
+                QVERIFY2(metrics.horizontalAdvance(text) <= 64.5, qPrintable(text));
+            QVERIFY(!text.endsWith(u' '));
+            if (i + 1 < lines.size()) {
+                // Greedy: the next line's first word (or character, inside a broken word) would not have fit.
+                const QString next = caption.mid(lines[i + 1].start, lines[i + 1].length);
+                const bool brokenWord = lines[i + 1].start == lines[i].start + lines[i].length;
+                const QString extended = brokenWord
+                    ? text + next.left(1)
+                    : caption.mid(lines[i].start, lines[i + 1].start - lines[i].start) + next.section(u' ', 0, 0);
+                QVERIFY2(metrics.horizontalAdvance(extended) > 63.5, qPrintable(extended));
+            }
+            words += text + u' ';
+        }
+        QCOMPARE(words.simplified().remove(u' '), caption.simplified().remove(u' '));
+        QCOMPARE(wrapper.height(caption, 64), int(lines.size()) * wrapper.lineSpacing());
+    }
+
+    void captionHardBreaksAndEmptyText()
+    {
+        CaptionWrapper wrapper(m_font);
+        QCOMPARE(wrapper.lineCount(QStringLiteral("A\nB"), 64), 2);
+        QCOMPARE(wrapper.lineCount(QStringLiteral("A\r\nB"), 64), 2);
+        QCOMPARE(wrapper.height(QString(), 64), wrapper.lineSpacing());
+        QCOMPARE(wrapper.lineCount(QStringLiteral("   "), 64), 1);
+        // A word of wide letters is broken between letters rather than running out of the caption.
+        QVERIFY(wrapper.lineCount(QStringLiteral("WWWWWWWWWWWWWWWW"), 64) >= 2);
+    }
+
+    void arrangeThreeCellsInUsableWidth283()
+    {
+        ListModel model = modelWithCaptions(7, {28, 42, 14});
+        ListLayoutState state;
+        SelectionFrame frame;
+        GridLayout::arrangeAll(model, state, frame, 283);
+        const QList<float> lefts {24, 104, 184, 24, 104, 184, 24};
+        for (int i = 0; i < 7; ++i)
+            QCOMPARE(model.at(i).iconLeft, lefts[i]);
+        QCOMPARE(model.at(0).iconTop, 14.0f);
+        QCOMPARE(model.at(0).captionLeft, 8.0f);
+        QCOMPARE(model.at(0).captionTop, 53.0f);
+        // The second row starts 14 below the tallest caption of the first.
+        const double firstRowBottom = 53 + 42;
+        QCOMPARE(double(model.at(3).iconTop), firstRowBottom + 14);
+        QCOMPARE(double(model.at(3).captionTop), firstRowBottom + 14 + 39);
+        const double secondRowTop = firstRowBottom + 14;
+        QCOMPARE(state.rowTops, (QList<double> {0, secondRowTop, secondRowTop + 39 + 42 + 14}));
+        QCOMPARE(state.maxColumns, 3);
+        QCOMPARE(state.nextCellX, 80.0);
+        QCOMPARE(state.lowestBottom, double(model.at(6).captionTop) + 28);
+    }
+
+    void arrangeBelowOneCellPutsEveryItemOnItsOwnRow()
+    {
+        ListModel model = modelWithCaptions(4, {14});
+        ListLayoutState state;
+        SelectionFrame frame;
+        GridLayout::arrangeAll(model, state, frame, 79);
+        QCOMPARE(state.rowTops.size(), 5);
+        QCOMPARE(state.rowTops[1], 14.0); // the first item takes the wrap branch too
+        for (int i = 0; i < 4; ++i)
+            QCOMPARE(model.at(i).iconLeft, 24.0f);
+        QCOMPARE(double(model.at(1).iconTop), 53 + 14 + 14.0);
+        QCOMPARE(state.maxColumns, 1);
+    }
+
+    void arrangeResetsScrollOffsetButKeepsFrameOnScreen()
+    {
+        ListModel model = modelWithCaptions(3, {14});
+        ListLayoutState state;
+        state.scrollOffsetY = -120;
+        SelectionFrame frame;
+        frame.rect = QRectF(5, 200, 73, 62); // unscrolled; shown at 80
+        GridLayout::arrangeAll(model, state, frame, 400);
+        QCOMPARE(state.scrollOffsetY, 0.0);
+        QCOMPARE(frame.rect.top(), 80.0);
+    }
+
+    void addingToScrolledListTakesLowestBottomScrolled()
+    {
+        ListModel model = modelWithCaptions(1, {28});
+        ListLayoutState state;
+        SelectionFrame frame;
+        GridLayout::arrangeAll(model, state, frame, 400);
+        state.scrollOffsetY = -200;
+        ListItem& item = model.load();
+        GridLayout::placeNext(item, state, 400);
+        item.captionHeight = 80;
+        GridLayout::finishAdd(item, state);
+        QCOMPARE(item.iconLeft, 104.0f);
+        QCOMPARE(item.iconTop, 14.0f); // shown at -186
+        // 53 + 80 - 200 is above the first caption's bottom, so the first stays the lowest.
+        QCOMPARE(state.lowestBottom, 53.0 + 28);
+        QCOMPARE(state.nextCellX, 160.0);
+    }
+
+    void scrollRange_data()
+    {
+        QTest::addColumn<int>("itemCount");
+        QTest::addColumn<double>("contentBottom");
+        QTest::addColumn<int>("clientHeight");
+        QTest::addColumn<bool>("needed");
+        QTest::addColumn<int>("maximum");
+        QTest::newRow("fits") << 5 << 200.0 << 300 << false << 0;
+        QTest::newRow("exactly fits") << 5 << 300.0 << 300 << false << 0;
+        QTest::newRow("one pixel more") << 5 << 301.0 << 300 << true << 15;
+        QTest::newRow("long list") << 500 << 9000.0 << 300 << true << 8714;
+        QTest::newRow("empty list never scrolls") << 0 << 9000.0 << 300 << false << 0;
+    }
+    void scrollRange()
+    {
+        QFETCH(int, itemCount);
+        QFETCH(double, contentBottom);
+        QFETCH(int, clientHeight);
+        QFETCH(bool, needed);
+        QFETCH(int, maximum);
+        const GridLayout::ScrollRange range
+            = GridLayout::scrollRange(itemCount, {100, contentBottom}, QSize(300, clientHeight));
+        QCOMPARE(range.needed, needed);
+        QCOMPARE(range.maximum, maximum);
+        if (needed) {
+            QCOMPARE(range.smallChange, 80);
+            QCOMPARE(range.largeChange, clientHeight);
+        }
+    }
+
+    void contentExtentIncludesFrameAndIgnoresScroll()
+    {
+        ListModel model = modelWithCaptions(2, {28});
+        ListLayoutState state;
+        SelectionFrame frame;
+        GridLayout::arrangeAll(model, state, frame, 400);
+        state.scrollOffsetY = -50;
+        QCOMPARE(GridLayout::contentExtent(model, frame, state).bottom, 53.0 + 28);
+        frame.rect = QRectF(0, 0, 10, 500);
+        QCOMPARE(GridLayout::contentExtent(model, frame, state).bottom, 500.0);
+        QCOMPARE(GridLayout::contentExtent(model, frame, state).right, 88.0 + 64);
+    }
+
+    void snapTarget_data()
+    {
+        QTest::addColumn<int>("value");
+        QTest::addColumn<int>("maximum");
+        QTest::addColumn<int>("expected"); // -1: no snapping
+        QTest::newRow("near first row") << 40 << 300 << 0;
+        QTest::newRow("near second row") << 60 << 300 << 97;
+        QTest::newRow("between third and fourth") << 250 << 300 << 291;
+        QTest::newRow("maximum is kept") << 300 << 300 << -1;
+        QTest::newRow("nearest row at the maximum") << 280 << 291 << -1;
+        QTest::newRow("tie keeps the earlier row") << 145 << 400 << 97;
+        QTest::newRow("on a row") << 194 << 300 << 194;
+    }
+    void snapTarget()
+    {
+        QFETCH(int, value);
+        QFETCH(int, maximum);
+        QFETCH(int, expected);
+        const QList<double> rowTops {0, 97, 194, 291};
+        const std::optional<int> target = RowSnapping::snapTarget(rowTops, value, maximum);
+        QCOMPARE(target.value_or(-1), expected);
+    }
+
+    void wheelTarget_data()
+    {
+        QTest::addColumn<int>("value");
+        QTest::addColumn<int>("notches");
+        QTest::addColumn<int>("expected");
+        QTest::newRow("down one row") << 0 << 1 << 97;
+        QTest::newRow("down two rows") << 0 << 2 << 194;
+        QTest::newRow("from between rows") << 120 << 1 << 194;
+        QTest::newRow("last row then maximum") << 194 << 2 << 250;
+        QTest::newRow("stays at maximum") << 250 << 1 << 250;
+        QTest::newRow("up from maximum") << 250 << -1 << 194;
+        QTest::newRow("up to the top") << 97 << -3 << 0;
+    }
+    void wheelTarget()
+    {
+        QFETCH(int, value);
+        QFETCH(int, notches);
+        QFETCH(int, expected);
+        const QList<double> rowTops {0, 97, 194, 291};
+        QCOMPARE(RowSnapping::wheelTarget(rowTops, value, 250, notches), expected);
+    }
+
+    void frameRectIsAsymmetric()
+    {
+        const QRectF frame = KeyNavigation::frameRect(QRectF(24, 14, 32, 32), QRectF(8, 53, 64, 28));
+        QCOMPARE(frame, QRectF(5, 11, 73, 76));
+        const QRectF flipped = KeyNavigation::frameRect(QRectF(10, 10, -40, 4), QRectF(10, 10, -40, 4));
+        QVERIFY(flipped.width() >= 0);
+    }
+
+    void referencePoint_data()
+    {
+        QTest::addColumn<QPointF>("icon");
+        QTest::addColumn<QPointF>("expected");
+        QTest::newRow("in view") << QPointF(104, 120) << QPointF(104, 120);
+        QTest::newRow("scrolled out above") << QPointF(104, -30) << QPointF(104, 95);
+        QTest::newRow("below the view") << QPointF(104, 400) << QPointF(104, 180);
+        QTest::newRow("left of the view") << QPointF(-5, 20) << QPointF(80, 20);
+        QTest::newRow("right of the view") << QPointF(500, 20) << QPointF(280, 20);
+    }
+    void referencePoint()
+    {
+        QFETCH(QPointF, icon);
+        QFETCH(QPointF, expected);
+        QCOMPARE(KeyNavigation::referencePoint(icon, 400, 300), expected);
+    }
+
+    void findNeighbour_data()
+    {
+        QTest::addColumn<int>("current");
+        QTest::addColumn<int>("keyCode");
+        QTest::addColumn<int>("expected"); // -1: nothing
+        QTest::newRow("right") << 0 << 39 << 1;
+        QTest::newRow("right at row end does not wrap") << 2 << 39 << -1;
+        QTest::newRow("left at row start") << 3 << 37 << -1;
+        QTest::newRow("left") << 4 << 37 << 3;
+        QTest::newRow("down same column") << 1 << 40 << 4;
+        QTest::newRow("down to the nearest of a shorter row") << 5 << 40 << 7;
+        QTest::newRow("up") << 7 << 38 << 4;
+        QTest::newRow("up on the first row") << 1 << 38 << -1;
+    }
+    void findNeighbour()
+    {
+        QFETCH(int, current);
+        QFETCH(int, keyCode);
+        QFETCH(int, expected);
+        ListModel model = modelWithCaptions(8, {28});
+        ListLayoutState state;
+        SelectionFrame frame;
+        GridLayout::arrangeAll(model, state, frame, 283);
+        const auto direction = KeyNavigation::directionFromKeyCode(keyCode);
+        QVERIFY(direction);
+        const ListItem& item = model.at(current);
+        const std::optional<int> found
+            = KeyNavigation::findNeighbour(model, 0, current, *direction, QPointF(item.iconLeft, item.iconTop), 300);
+        QCOMPARE(found.value_or(-1), expected);
+    }
+
+    void findNeighbourTieKeepsLowerIndex()
+    {
+        ListModel model = modelWithCaptions(3, {14});
+        model.at(0).iconLeft = 100;
+        model.at(0).iconTop = 0;
+        model.at(1).iconLeft = 60;
+        model.at(1).iconTop = 100;
+        model.at(2).iconLeft = 140;
+        model.at(2).iconTop = 100;
+        const auto found
+            = KeyNavigation::findNeighbour(model, 0, 0, KeyNavigation::Direction::Down, QPointF(100, 0), 300);
+        QCOMPARE(found.value_or(-1), 1);
+        // Shown positions count: scrolled up by 150, nothing lies below the reference any more.
+        QVERIFY(!KeyNavigation::findNeighbour(model, -150, 0, KeyNavigation::Direction::Down, QPointF(100, 0), 300));
+        QVERIFY(!KeyNavigation::directionFromKeyCode(13));
+    }
+
+private:
+    QFont m_font;
+};
+
+int main(int argc, char** argv)
+{
+    TestEnvironment environment;
+    qputenv("QT_QPA_PLATFORM", "offscreen");
+    QGuiApplication app(argc, argv);
+    TestListLayout test;
+    return QTest::qExec(&test, argc, argv);
+}
+
+#include "tst_listlayout.moc"
