@@ -6,7 +6,7 @@
 
 QString WriteFuzzInput(const uint8_t* data, size_t size)
 {
-    static const QString path = [] {
+    static const QString path = []() -> QString {
         const QString shm = QStringLiteral("/dev/shm");
         const QString dir = QDir(shm).exists() ? shm : QDir::tempPath();
         return dir + QStringLiteral("/brimvault-fuzz-") + QString::number(QCoreApplication::applicationPid());

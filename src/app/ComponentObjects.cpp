@@ -49,19 +49,16 @@ bool prepareArguments(const QMetaMethod& method, const QVariantList& args, Prepa
     for (int i = 0; i < method.parameterCount(); ++i) {
         const QMetaType type = method.parameterMetaType(i);
         QVariant value = args.at(i);
-        if (type == QMetaType::fromType<QVariant>())
-            prepared.values.push_back(value);
-        else if (value.metaType() == type || value.convert(type))
-            prepared.values.push_back(value);
-        else
+        const bool passedAsVariant = type == QMetaType::fromType<QVariant>();
+        if (!passedAsVariant && value.metaType() != type && !value.convert(type))
             return false;
+        prepared.values.push_back(value);
         prepared.typeNames.push_back(method.parameterTypeName(i));
     }
     for (int i = 0; i < method.parameterCount(); ++i) {
         // A QVariant parameter points at the QVariant itself, every other type at the value inside.
         const QVariant& value = prepared.values[size_t(i)];
-        const void* data
-            = method.parameterMetaType(i) == QMetaType::fromType<QVariant>() ? &args.at(i) : value.constData();
+        const void* data = method.parameterMetaType(i) == QMetaType::fromType<QVariant>() ? &value : value.constData();
         prepared.generic[size_t(i)] = QGenericArgument(prepared.typeNames[size_t(i)].constData(), data);
     }
     return true;

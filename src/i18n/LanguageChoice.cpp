@@ -95,11 +95,8 @@ void InitLocalizer()
     const QString storedFile = FileNameOf(GetSetting(AppTitle(), kSection, kFileNameKey).trimmed());
     QString storedShortName = GetSetting(AppTitle(), kSection, kShortNameKey);
 
-    if (storedFile.compare(BuiltInLanguageName(), Qt::CaseInsensitive) == 0) {
-        UseBuiltInLanguage();
-        return;
-    }
-    if (!storedFile.isEmpty()) {
+    // The built-in language counts as no choice: a language file matching the system's character set wins.
+    if (!storedFile.isEmpty() && storedFile.compare(BuiltInLanguageName(), Qt::CaseInsensitive) != 0) {
         if (storedShortName.isEmpty())
             storedShortName = ShortNameFromFileName(storedFile);
         LoadChosenFile(storedFile, storedShortName);
@@ -116,7 +113,8 @@ void InitLocalizer()
         }
     }
     UseBuiltInLanguage();
-    SaveSetting(AppTitle(), kSection, kFileNameKey, BuiltInLanguageName());
+    if (storedFile.isEmpty())
+        SaveSetting(AppTitle(), kSection, kFileNameKey, BuiltInLanguageName());
     if (storedShortName.isEmpty())
         SaveSetting(AppTitle(), kSection, kShortNameKey, BuiltInShortName());
 }

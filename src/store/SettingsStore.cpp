@@ -5,13 +5,23 @@
 #include <QDir>
 #include <QFile>
 #include <QHash>
-#include <QLockFile>
 #include <QMutex>
 #include <QSaveFile>
 #include <QSettings>
 #include <QStandardPaths>
 
 #include <functional>
+#include <memory>
+
+#ifndef Q_OS_WIN
+#include <QElapsedTimer>
+#include <QThread>
+
+#include <cerrno>
+#include <fcntl.h>
+#include <sys/file.h>
+#include <unistd.h>
+#endif
 
 namespace Brimvault {
 
@@ -93,7 +103,7 @@ namespace {
 // File stamps cannot tell: a same-size rewrite within the clock's tick may even reuse the inode.
 struct CachedFile {
     QByteArray bytes;
-    IniDocument doc;
+    std::shared_ptr<const IniDocument> doc;
 };
 
 QMutex cacheMutex;
@@ -116,41 +126,74 @@ ReadState readBytes(const QString& path, QByteArray& bytes)
     return file.error() == QFileDevice::NoError ? ReadState::Read : ReadState::Unreadable;
 }
 
-IniDocument parsedDocument(const QString& path, const QByteArray& bytes)
+std::shared_ptr<const IniDocument> parsedDocument(const QString& path, const QByteArray& bytes)
 {
     QMutexLocker lock(&cacheMutex);
     auto it = cache().find(path);
     if (it != cache().end() && it->bytes == bytes)
         return it->doc;
-    IniDocument doc = IniDocument::parse(bytes);
+    auto doc = std::make_shared<const IniDocument>(IniDocument::parse(bytes));
     cache().insert(path, {bytes, doc});
     return doc;
 }
 
-IniDocument currentDocument(const QString& path)
+std::shared_ptr<const IniDocument> currentDocument(const QString& path)
 {
     QByteArray bytes;
     if (readBytes(path, bytes) != ReadState::Read)
-        return {};
+        return std::make_shared<const IniDocument>();
     return parsedDocument(path, bytes);
 }
 
-// Read, change and write back under a lock file, so that two processes writing at once both keep their
+// One writer at a time across processes. The kernel drops a flock() when its holder ends, so a writer that
+// crashed never leaves a stale lock behind, and a waiting writer gets the lock as soon as it is free.
+class WriteLock {
+public:
+    explicit WriteLock(const QString& lockPath)
+        : m_fd(::open(QFile::encodeName(lockPath).constData(), O_RDWR | O_CREAT | O_CLOEXEC, 0600))
+    { }
+    ~WriteLock()
+    {
+        if (m_fd >= 0)
+            ::close(m_fd);
+    }
+    WriteLock(const WriteLock&) = delete;
+    WriteLock& operator=(const WriteLock&) = delete;
+
+    bool acquire(int timeoutMs)
+    {
+        if (m_fd < 0)
+            return false;
+        QElapsedTimer waited;
+        waited.start();
+        while (::flock(m_fd, LOCK_EX | LOCK_NB) != 0) {
+            if ((errno != EWOULDBLOCK && errno != EINTR) || waited.hasExpired(timeoutMs))
+                return false;
+            QThread::msleep(1);
+        }
+        return true;
+    }
+
+private:
+    int m_fd;
+};
+
+// Read, change and write back under a lock, so that two processes writing at once both keep their
 // change. A file that exists but cannot be read is never overwritten.
 bool modifyDocument(const QString& appName, const std::function<bool(IniDocument&)>& change)
 {
     const QString path = SettingsFilePath(appName);
     if (!QDir().mkpath(QFileInfo(path).absolutePath()))
         return false;
-    QLockFile lock(path + QStringLiteral(".lock"));
-    lock.setStaleLockTime(10000);
-    if (!lock.tryLock(10000))
+    WriteLock lock(path + QStringLiteral(".lock"));
+    if (!lock.acquire(10000))
         return false;
 
     QByteArray bytes;
-    if (readBytes(path, bytes) == ReadState::Unreadable)
+    const ReadState state = readBytes(path, bytes);
+    if (state == ReadState::Unreadable)
         return false;
-    IniDocument doc = parsedDocument(path, bytes);
+    IniDocument doc = state == ReadState::Read ? *parsedDocument(path, bytes) : IniDocument();
     if (!change(doc))
         return true;
 
@@ -163,7 +206,7 @@ bool modifyDocument(const QString& appName, const std::function<bool(IniDocument
         return false;
 
     QMutexLocker cacheLock(&cacheMutex);
-    cache().insert(path, {changed, doc});
+    cache().insert(path, {changed, std::make_shared<const IniDocument>(std::move(doc))});
     return true;
 }
 
@@ -171,7 +214,7 @@ bool modifyDocument(const QString& appName, const std::function<bool(IniDocument
 
 QString GetSetting(const QString& appName, const QString& section, const QString& key, const QString& defaultValue)
 {
-    return currentDocument(SettingsFilePath(appName)).value(section, key).value_or(defaultValue);
+    return currentDocument(SettingsFilePath(appName))->value(section, key).value_or(defaultValue);
 }
 
 bool SaveSetting(const QString& appName, const QString& section, const QString& key, const QString& value)
@@ -198,7 +241,7 @@ bool DeleteSection(const QString& appName, const QString& section)
 
 QList<QPair<QString, QString>> GetAllSettings(const QString& appName, const QString& section)
 {
-    return currentDocument(SettingsFilePath(appName)).sectionPairs(section);
+    return currentDocument(SettingsFilePath(appName))->sectionPairs(section);
 }
 
 #endif

@@ -108,7 +108,10 @@ std::unique_ptr<ChildProcess> ChildProcess::Start(const ResolvedCommand& command
     // A started program must not read our terminal: from its own process group that would stop it for good.
     posix_spawn_file_actions_t files;
     posix_spawn_file_actions_init(&files);
-    //posix_spawn_file_actions_addopen(&files, STDIN_FILENO, "/dev/null", O_RDONLY, 0);
+    posix_spawn_file_actions_addopen(&files, STDIN_FILENO, "/dev/null", O_RDONLY, 0);
+#if defined(__GLIBC__) && __GLIBC_PREREQ(2, 34)
+    posix_spawn_file_actions_addclosefrom_np(&files, STDERR_FILENO + 1);
+#endif
     pid_t pid = 0;
     const int error = posix_spawn(&pid, program.constData(), &files, attributes.get(), argv.data(), environ);
     posix_spawn_file_actions_destroy(&files);

@@ -104,8 +104,11 @@ void tst_LanguageChoice::startUpChoice_data()
     QTest::newRow("stored file outside program folder is not followed")
         << QStringLiteral("../Brimvault_Polish.lng") << none << QByteArray("ru_RU") << QStringList() << true
         << QStringLiteral("Polish") << QStringLiteral("POLISH") << QStringLiteral("../Brimvault_Polish.lng") << none;
-    QTest::newRow("stored built-in choice respected")
-        << english << eng << QByteArray("ru_RU") << QStringList() << true << english << eng << english << eng;
+    QTest::newRow("stored built-in language, matching file picked")
+        << english << eng << QByteArray("ru_RU") << QStringList() << true << QStringLiteral("Russian")
+        << QStringLiteral("RUSSIAN") << QStringLiteral("Brimvault_Russian.lng") << QStringLiteral("RUSSIAN");
+    QTest::newRow("stored built-in language, no match")
+        << english << eng << QByteArray("en_US") << QStringList() << true << english << eng << english << eng;
     QTest::newRow("no choice, Russian system")
         << none << none << QByteArray("ru_RU") << QStringList() << true << QStringLiteral("Russian")
         << QStringLiteral("RUSSIAN") << QStringLiteral("Brimvault_Russian.lng") << QStringLiteral("RUSSIAN");

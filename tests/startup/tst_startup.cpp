@@ -138,6 +138,7 @@ private Q_SLOTS:
     void failingComponentStopsStartup_data();
     void failingComponentStopsStartup();
     void unwritableRegistryShowsMessage();
+    void movedProgramRegistersAgain();
     void versionComparison_data();
     void versionComparison();
     void registerComponent_data();
@@ -235,6 +236,30 @@ void TestStartup::unwritableRegistryShowsMessage()
     QVERIFY(GetAllSettings(AppTitle(), QStringLiteral("Settings")).isEmpty());
 }
 
+void TestStartup::movedProgramRegistersAgain()
+{
+    TestEnvironment env;
+    RecordingPrompts prompts;
+    {
+        TempProgramFolder oldFolder;
+        QVERIFY(oldFolder.addAllComponentsBut(QString()));
+        modMain::Main();
+        QCOMPARE(visibleMainWindows(), 1);
+        cleanup();
+    }
+    // The registry now names files that are gone; start-up registers the new ones.
+    TempProgramFolder newFolder;
+    QVERIFY(newFolder.addAllComponentsBut(QString()));
+    modMain::Main();
+
+    QVERIFY(prompts.requests().isEmpty());
+    QCOMPARE(visibleMainWindows(), 1);
+    for (const CompanionComponent& component : CompanionComponents()) {
+        QCOMPARE(RegisteredLibrary(component.prefix + QStringLiteral(".clsVersion")),
+            QFileInfo(newFolder.filePath(component.prefix)).absoluteFilePath());
+    }
+}
+
 void TestStartup::versionComparison_data()
 {
     QTest::addColumn<QString>("saved"); // a null text: no value saved
@@ -275,10 +300,11 @@ void TestStartup::versionComparison()
     const FileStamp settingsBefore = stampOf(env.settingsFile());
     const FileStamp registryBefore = stampOf(ComponentRegistryPath());
 
-    modMain::Main();
+    // The checks alone: localisation, which Main runs next, keeps its own settings.
+    for (const CompanionComponent& component : CompanionComponents())
+        QVERIFY2(modMain::CheckComponent(component.prefix), qPrintable(component.prefix));
 
     QVERIFY(prompts.requests().isEmpty());
-    QCOMPARE(visibleMainWindows(), 1);
     QCOMPARE(savedVersion(QStringLiteral("Quillet")), installed);
     QCOMPARE(stampOf(env.settingsFile()) != settingsBefore, written);
     QVERIFY(stampOf(ComponentRegistryPath()) == registryBefore);

@@ -11,6 +11,7 @@
 #include <QTimer>
 
 #include <csignal>
+#include <fcntl.h>
 #include <signal.h>
 #include <thread>
 #include <unistd.h>
@@ -89,6 +90,7 @@ private Q_SLOTS:
     void noLimitWaitsForTheEnd();
     void quickProcessPumpsNothing();
     void startedProgramReadsNothingFromUs();
+    void startedProgramGetsNoneOfOurFiles();
     void endedProcessLeavesNoZombie();
     void processSurvivesTimeOut();
     void userBreak_data();
@@ -266,7 +268,7 @@ void tst_ShellAndWait::startedProgramReadsNothingFromUs()
 {
     // Our input is a pipe that never ends; a program reading its input must still see an end at once.
     int pipeEnds[2];
-    QCOMPARE(::pipe(pipeEnds), 0);
+    QCOMPARE(::pipe2(pipeEnds, O_CLOEXEC), 0);
     const int savedInput = ::dup(STDIN_FILENO);
     ::dup2(pipeEnds[0], STDIN_FILENO);
     const int result = ShellAndWait(QStringLiteral("sh -c \"cat > '%1'\"").arg(pidFile()), 3000, 0, 0);
@@ -276,6 +278,18 @@ void tst_ShellAndWait::startedProgramReadsNothingFromUs()
 
     QCOMPARE(result, WaitEnded);
     QVERIFY(QFile::exists(pidFile()));
+}
+
+void tst_ShellAndWait::startedProgramGetsNoneOfOurFiles()
+{
+    int pipeEnds[2];
+    QCOMPARE(::pipe(pipeEnds), 0);
+    const QString probe = QStringLiteral("sh -c \"[ -e /proc/self/fd/%1 ] && echo inherited > '%2'\"");
+    const int result = ShellAndWait(probe.arg(pipeEnds[1]).arg(pidFile()), 3000, 0, 0);
+    ::close(pipeEnds[0]);
+    ::close(pipeEnds[1]);
+    QCOMPARE(result, WaitEnded);
+    QVERIFY(!QFile::exists(pidFile()));
 }
 
 void tst_ShellAndWait::endedProcessLeavesNoZombie()

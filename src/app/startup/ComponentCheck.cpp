@@ -9,6 +9,8 @@
 #include <QFileInfo>
 #include <QLibrary>
 
+#include <optional>
+
 namespace Brimvault::modMain {
 
 namespace {

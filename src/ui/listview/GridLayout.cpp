@@ -11,11 +11,12 @@ namespace Brimvault::GridLayout {
 
 namespace {
 
-int toInt16(double value)
+// Scroll positions are not held to 16 bits: a library of tens of thousands of games is far taller than
+// 32767 pixels and must still scroll to its end.
+int toScrollPosition(double value)
 {
     const double rounded = roundHalfEven(value);
-    return int(
-        std::clamp(rounded, double(std::numeric_limits<qint16>::min()), double(std::numeric_limits<qint16>::max())));
+    return int(std::clamp(rounded, 0.0, double(std::numeric_limits<int>::max())));
 }
 
 double iconOffset()
@@ -119,9 +120,9 @@ ScrollRange scrollRange(int itemCount, const Extent& extent, QSize client)
     range.needed = extent.bottom > client.height();
     if (!range.needed)
         return range;
-    range.maximum = toInt16(extent.bottom - client.height() + ListGrid::RowGap);
+    range.maximum = toScrollPosition(extent.bottom - client.height() + ListGrid::RowGap);
     range.smallChange = ListGrid::CellWidth;
-    range.largeChange = client.height() > 0 ? toInt16(client.height()) : 0;
+    range.largeChange = client.height() > 0 ? toScrollPosition(client.height()) : 0;
     return range;
 }
 

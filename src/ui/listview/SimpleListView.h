@@ -32,7 +32,10 @@ public:
 
     void ArrangeConstituentControls();
     bool Add(const QPixmap& Picture, const QString& Caption, const QString& Data);
+    // Both refuse (false, -1) beyond 32767 items; AddEx returns the new item's index.
     qint16 AddEx(const QString& Caption, const QString& Data);
+    // Removing the only item fails with the missing-element error and leaves the selection tag at "-1";
+    // nothing else changes, so the host clears the list with RemoveAll instead.
     ListError RemoveCurrentItem();
     void RemoveAll();
     void InitSelection();
@@ -64,6 +67,8 @@ public:
     QTimer* Timer1() const { return m_timer; }
 
 Q_SIGNALS:
+    // Arguments passed by reference may be changed by a directly connected host: an Effect of 0 refuses a
+    // drop (1 copy, 2 move, 4 link). Button: 1 left, 2 right, 4 middle; Shift: 1 shift, 2 control, 4 alt.
     void EnterKey(QString& Data);
     void OLECompleteDrag(qint32 Effect);
     void OLEDragDrop(const QMimeData* Data, qint32& Effect, qint16 Button, qint16 Shift, float X, float Y);

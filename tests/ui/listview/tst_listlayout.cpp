@@ -1,5 +1,6 @@
 #include "ui/listview/CaptionWrapper.h"
 #include "ui/listview/GridLayout.h"
+#include "ui/listview/ItemBands.h"
 #include "ui/listview/KeyNavigation.h"
 #include "ui/listview/ListModel.h"
 #include "ui/listview/RowSnapping.h"
@@ -182,6 +183,7 @@ private Q_SLOTS:
         QTest::newRow("exactly fits") << 5 << 300.0 << 300 << false << 0;
         QTest::newRow("one pixel more") << 5 << 301.0 << 300 << true << 15;
         QTest::newRow("long list") << 500 << 9000.0 << 300 << true << 8714;
+        QTest::newRow("taller than 16 bits") << 20000 << 400000.0 << 300 << true << 399714;
         QTest::newRow("empty list never scrolls") << 0 << 9000.0 << 300 << false << 0;
     }
     void scrollRange()
@@ -330,6 +332,42 @@ private Q_SLOTS:
         // Shown positions count: scrolled up by 150, nothing lies below the reference any more.
         QVERIFY(!KeyNavigation::findNeighbour(model, -150, 0, KeyNavigation::Direction::Down, QPointF(100, 0), 300));
         QVERIFY(!KeyNavigation::directionFromKeyCode(13));
+    }
+
+    void bandsFindItemsNearAnArea()
+    {
+        ListModel model = modelWithCaptions(60, {28, 90, 14});
+        ListLayoutState state;
+        SelectionFrame frame;
+        GridLayout::arrangeAll(model, state, frame, 283);
+        ItemBands bands;
+        std::vector<int> found;
+        auto reaches = [&](int i, double top, double bottom) {
+            const ListItem& item = model.at(i);
+            const double itemTop = std::min(item.iconTop, item.captionTop);
+            const double itemBottom = std::max(item.iconTop + 32.0, double(item.captionTop) + item.captionHeight);
+            return itemBottom >= top && itemTop <= bottom;
+        };
+        for (const auto& [top, bottom] :
+            QList<QPair<double, double>> {{0, 10}, {250, 260}, {500, 1400}, {3000, 3001}, {99999, 100000}}) {
+            bands.collect(model, top, bottom, found);
+            QVERIFY(std::is_sorted(found.begin(), found.end()));
+            // Every item that reaches into the area is found.
+            for (int i = 0; i < model.loadedCount(); ++i) {
+                if (reaches(i, top, bottom))
+                    QVERIFY2(std::find(found.begin(), found.end(), i) != found.end(), qPrintable(QString::number(i)));
+            }
+        }
+        // Appending keeps the index current without a rebuild; invalidation rebuilds it from the model.
+        ListItem& added = model.load();
+        GridLayout::placeNext(added, state, 283);
+        bands.append(60, added);
+        bands.collect(model, added.iconTop, added.iconTop + 1, found);
+        QVERIFY(std::find(found.begin(), found.end(), 60) != found.end());
+        model.at(0).captionHeight = 5000;
+        bands.invalidate();
+        bands.collect(model, 4000, 4001, found);
+        QVERIFY(std::find(found.begin(), found.end(), 0) != found.end());
     }
 
 private:

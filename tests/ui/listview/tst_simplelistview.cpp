@@ -477,6 +477,30 @@ private Q_SLOTS:
         QCOMPARE(up.last().at(0).toInt(), 2);
     }
 
+    void clicksFindItemsInAScrolledLongList()
+    {
+        auto list = makeList(283, 250, 300);
+        QVERIFY(list);
+        QScrollBar* bar = list->vbarWindow();
+        bar->setValue(int(list->layoutState().rowTops.at(60)));
+        for (int index : {180, 181, 182, 183}) {
+            QVERIFY(list->imgN(index).geometry().top() < 250);
+            QTest::mouseClick(list.get(), Qt::LeftButton, {}, iconCentre(*list, index));
+            QCOMPARE(list->currentIndex(), index);
+        }
+        // A caption that grew after the last arrangement is still found below its old bottom.
+        const QRectF before = list->labN(183).geometry();
+        list->SetCurrentCaption(QStringLiteral("A caption long enough to wrap over many many lines of the grid"));
+        const QRectF after = list->labN(183).geometry();
+        QVERIFY(after.bottom() > before.bottom() + 20);
+        QTest::mouseClick(list.get(), Qt::LeftButton, {}, iconCentre(*list, 181));
+        // In the gap above the next row's icon, where only the grown caption lies.
+        const qreal gap = list->imgN(186).geometry().top() - 5;
+        QVERIFY(after.bottom() > gap);
+        QTest::mouseClick(list.get(), Qt::LeftButton, {}, QPoint(int(after.left()) + 2, int(gap)));
+        QCOMPARE(list->currentIndex(), 183);
+    }
+
     void clicksOnTheBackgroundSelectNothing()
     {
         auto list = makeList(400, 400, 2);
@@ -572,6 +596,22 @@ private Q_SLOTS:
         QVERIFY(!denied.isAccepted());
     }
 
+    void dragRefusedByTheHostCompletesAtOnce()
+    {
+        SimpleListView list;
+        QList<int> offered;
+        connect(&list, &SimpleListView::OLEStartDrag, this, [&](QMimeData* data, qint32& allowed) {
+            QVERIFY(data);
+            offered << allowed;
+            allowed = 0;
+        });
+        QSignalSpy completed(&list, &SimpleListView::OLECompleteDrag);
+        list.OLEDrag();
+        QCOMPARE(offered, QList<int> {int(Qt::CopyAction | Qt::MoveAction)});
+        QCOMPARE(completed.count(), 1);
+        QCOMPARE(completed.at(0).at(0).toInt(), 0);
+    }
+
     void propertiesPersistOnlyWhenNotDefault()
     {
         SimpleListView list;
@@ -606,6 +646,23 @@ private Q_SLOTS:
         QCOMPARE(list.AddEx(QStringLiteral("One too many"), QString()), qint16(-1));
         QVERIFY(!list.Add(QPixmap(), QStringLiteral("One too many"), QString()));
         QCOMPARE(list.loadedCount(), 32767);
+    }
+
+    void longLibraryScrollsToItsLastGame()
+    {
+        auto list = makeList(480, 400, 0);
+        QVERIFY(list);
+        for (int i = 0; i < 20000; ++i)
+            list->AddEx(captionFor(i), dataFor(i));
+        list->Refresh();
+        QScrollBar* bar = list->vbarWindow();
+        QVERIFY(bar->maximum() > 32767);
+        bar->setValue(bar->maximum());
+        const QRectF last = list->labN(19999).geometry();
+        QVERIFY(last.top() > 0);
+        QVERIFY(last.bottom() <= list->height());
+        QTest::mouseClick(list.get(), Qt::LeftButton, {}, iconCentre(*list, 19999));
+        QCOMPARE(list->GetCurrentData(), dataFor(19999));
     }
 
     void iconBuilderFillsPicturesLater()
