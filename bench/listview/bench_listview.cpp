@@ -87,6 +87,29 @@ void settle()
     QApplication::processEvents();
 }
 
+// Counts paint events anywhere in the application, so that a figure which painted nothing is noticed.
+class PaintCounter : public QObject {
+public:
+    int paints = 0;
+
+protected:
+    bool eventFilter(QObject* watched, QEvent* event) override
+    {
+        if (event->type() == QEvent::Paint)
+            ++paints;
+        return QObject::eventFilter(watched, event);
+    }
+};
+
+PaintCounter* paintCounter = nullptr;
+
+void expectPainted(const char* what)
+{
+    if (paintCounter->paints == 0)
+        std::fprintf(stderr, "warning: %s painted nothing\n", what);
+    paintCounter->paints = 0;
+}
+
 struct Figures {
     double fillShowMs = 0;
     double resizeMs = 0;
@@ -126,15 +149,18 @@ Figures measure(const Subject& subject, int count)
         memory.push_back(itemMemoryKb(subject, count));
         QElapsedTimer timer;
         timer.start();
+        paintCounter->paints = 0;
         std::shared_ptr<QWidget> widget = subject.build(count);
         settle();
         fill.push_back(timer.nsecsElapsed() / 1e6);
+        expectPainted("fill and show");
 
         timer.restart();
-        widget->resize(run % 2 ? StartSize : ResizedSize);
+        widget->resize(ResizedSize);
         subject.relayout(widget.get());
         settle();
         resize.push_back(timer.nsecsElapsed() / 1e6);
+        expectPainted("resize");
 
         QScrollBar* bar = subject.bar(widget.get());
         timer.restart();
@@ -143,6 +169,7 @@ Figures measure(const Subject& subject, int count)
             settle();
         }
         scroll.push_back(timer.nsecsElapsed() / 1e6 / ScrollSteps);
+        expectPainted("scrolling");
     }
     return {median(fill), median(resize), median(scroll), median(memory)};
 }
@@ -161,6 +188,9 @@ int main(int argc, char** argv)
     if (qEnvironmentVariableIsEmpty("QT_QPA_PLATFORM"))
         qputenv("QT_QPA_PLATFORM", "offscreen");
     QApplication app(argc, argv);
+    PaintCounter counter;
+    paintCounter = &counter;
+    app.installEventFilter(&counter);
     const std::vector<QPixmap> pictures = makePictures();
 
     for (int count : {1000, 20000}) {

@@ -19,7 +19,8 @@ struct AddedGame {
 // Every entry of the section in the store's order, without the counter.
 QList<AddedGame> AddedGames();
 
-// Gives out the next entry number, stores the path under it and returns its key.
+// Gives out the next entry number ("Count" + 1, written back first), stores the path under it and returns
+// its key. A counter below a number still in use (edited by hand, lost) is passed over, never reused.
 QString AddGame(const QString& path);
 
 // The entry whose path matches, ignoring letter case and surrounding blanks.

@@ -9,8 +9,8 @@ namespace {
 
 const QString crLf = QStringLiteral("\r\n");
 
-// Where key occurs from position from on, ignoring case; -1 when it does not. Like the classic string
-// search, an empty text holds nothing and an empty key is found at the start position.
+// Where key occurs from position from on, ignoring case; -1 when it does not. An empty text holds nothing
+// and an empty key is found at the start position, so that loops over the text always end.
 qsizetype findKey(const QString& text, const QString& key, qsizetype from)
 {
     if (text.isEmpty() || from < 0 || from >= text.size())

@@ -63,7 +63,7 @@ std::optional<int> answerUserBreak(int breakAction)
 int waitForEnd(ChildProcess& process, int timeoutMs, int breakAction)
 {
     const auto breakPending = [] { return UserBreakScope::Pending(); };
-    int elapsed = 0;
+    qint64 elapsed = 0;
     ChildProcess::Wait outcome = process.wait(pollInterval, breakPending);
     for (;;) {
         if (outcome == ChildProcess::Wait::Interrupted) {

@@ -340,8 +340,12 @@ void tst_ShellAndWait::userBreak()
     // A signal arrives during the first wait; a request comes from an event handled at the first pump.
     std::thread interrupter;
     if (bySignal) {
-        interrupter = std::thread([] {
-            std::this_thread::sleep_for(std::chrono::milliseconds(200));
+        // Only once the program runs is the wait (and its handler) certainly in place.
+        const QByteArray started = QFile::encodeName(pidFile());
+        interrupter = std::thread([started] {
+            for (int tries = 0; tries < 500 && ::access(started.constData(), F_OK) != 0; ++tries)
+                std::this_thread::sleep_for(std::chrono::milliseconds(5));
+            std::this_thread::sleep_for(std::chrono::milliseconds(100));
             ::kill(::getpid(), SIGINT);
         });
     } else {

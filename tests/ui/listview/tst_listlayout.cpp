@@ -64,6 +64,13 @@ private Q_SLOTS:
         QTest::newRow("blanks between") << QStringLiteral("Mah   Jongg  Quest of the Dragon");
         QTest::newRow("cyrillic") << QStringLiteral("Косынка и другие пасьянсы");
         QTest::newRow("inserted blanks") << QStringLiteral("Superlongnam egamewithoutb lanks...");
+        QTest::newRow("emoji word") << QString::fromUtf8("\xF0\x9F\x8E\xAE\xF0\x9F\x8E\xB2\xF0\x9F\x8E\xAF"
+                                                         "\xF0\x9F\x8E\xAE\xF0\x9F\x8E\xB2\xF0\x9F\x8E\xAF "
+                                                         "Party");
+        QTest::newRow("arabic") << QString::fromUtf8("\xD9\x84\xD8\xB9\xD8\xA8\xD8\xA9 "
+                                                     "\xD8\xA7\xD9\x84\xD8\xB4\xD8\xB7\xD8\xB1\xD9\x86"
+                                                     "\xD8\xAC \xD8\xA7\xD9\x84\xD9\x83\xD8\xA8\xD9\x8A"
+                                                     "\xD8\xB1\xD8\xA9");
     }
     void captionLinesFitAndAreGreedy()
     {
@@ -79,6 +86,7 @@ private Q_SLOTS:
             if (text.size() > 1)
                 QVERIFY2(metrics.horizontalAdvance(text) <= 64.5, qPrintable(text));
             QVERIFY(!text.endsWith(u' '));
+            QVERIFY(text.isEmpty() || !text.front().isLowSurrogate());
             if (i + 1 < lines.size()) {
                 // Greedy: the next line's first word (or character, inside a broken word) would not have fit.
                 const QString next = caption.mid(lines[i + 1].start, lines[i + 1].length);
