@@ -1,0 +1,147 @@
+// Main-icon extraction to .ico over real PE files, beside wrestool over the same files and beside just reading
+// their bytes. Prints figure and ratio lines (ratios are our time over the reference's: below 1 is ahead).
+#include "icons/cFileIcon.h"
+
+#include <QCoreApplication>
+#include <QCryptographicHash>
+#include <QDir>
+#include <QDirIterator>
+#include <QElapsedTimer>
+#include <QFile>
+#include <QProcess>
+#include <QSet>
+#include <QStandardPaths>
+#include <QTemporaryDir>
+#include <QTextStream>
+#include <algorithm>
+#include <functional>
+
+using namespace Brimvault;
+
+namespace {
+
+QStringList peFiles()
+{
+    QStringList roots { QStringLiteral(BRIMVAULT_TEST_DATA_DIR "/pe"), QStringLiteral("/usr/lib/gcc/x86_64-w64-mingw32"),
+        QStringLiteral("/usr/lib/gcc/i686-w64-mingw32"), QStringLiteral("/usr/x86_64-w64-mingw32/lib"),
+        QStringLiteral("/usr/i686-w64-mingw32/lib"), QStringLiteral("/usr/lib/python3"), QStringLiteral("/usr/lib/wine"),
+        QStringLiteral("/usr/lib/x86_64-linux-gnu/wine"), QStringLiteral("/usr/lib/perf-core"),
+        QStringLiteral("/usr/lib/google-cloud-sdk/platform"), QDir::homePath() + QStringLiteral("/.pyenv/versions") };
+    const QString extra = qEnvironmentVariable("BRIMVAULT_PE_CORPUS");
+    if (!extra.isEmpty())
+        roots = extra.split(u':', Qt::SkipEmptyParts) + roots;
+    QStringList files;
+    QSet<QByteArray> seen;
+    for (const QString& root : roots) {
+        QDirIterator it(root, { QStringLiteral("*.exe"), QStringLiteral("*.dll") }, QDir::Files,
+            QDirIterator::Subdirectories);
+        while (it.hasNext()) {
+            const QString path = it.next();
+            QFile file(path);
+            if (file.size() < 64 || !file.open(QIODevice::ReadOnly) || file.peek(2) != "MZ")
+                continue;
+            const QByteArray hash = QCryptographicHash::hash(file.readAll(), QCryptographicHash::Sha1);
+            if (!seen.contains(hash)) {
+                seen.insert(hash);
+                files.append(path);
+            }
+        }
+    }
+    return files;
+}
+
+// Median seconds per pass over the files, each sample repeating passes for at least a quarter second.
+double secondsPerPass(const std::function<void()>& pass)
+{
+    QList<double> samples;
+    for (int sample = 0; sample < 5; ++sample) {
+        QElapsedTimer timer;
+        timer.start();
+        int passes = 0;
+        do {
+            pass();
+            ++passes;
+        } while (timer.nsecsElapsed() < 250'000'000);
+        samples.append(double(timer.nsecsElapsed()) / 1e9 / passes);
+    }
+    std::sort(samples.begin(), samples.end());
+    return samples.at(samples.size() / 2);
+}
+
+} // namespace
+
+int main(int argc, char** argv)
+{
+    QCoreApplication app(argc, argv);
+    QTextStream out(stdout);
+    const QStringList files = peFiles();
+    QTemporaryDir scratch;
+    if (files.isEmpty() || !scratch.isValid()) {
+        out << "no PE files found\n";
+        return 1;
+    }
+    qint64 bytes = 0;
+    int withIcon = 0;
+    for (const QString& file : files) {
+        bytes += QFileInfo(file).size();
+        cFileIcon icon;
+        withIcon += icon.LoadMainIconFromEXE(file) ? 1 : 0;
+    }
+    out << "files " << files.size() << " (" << withIcon << " with an icon, " << bytes / 1024 << " KiB)\n";
+
+    const double read = secondsPerPass([&] {
+        for (const QString& file : files) {
+            QFile f(file);
+            if (f.open(QIODevice::ReadOnly))
+                (void)f.readAll();
+        }
+    });
+    const QString target = scratch.filePath(QStringLiteral("main.ico"));
+    const double ours = secondsPerPass([&] {
+        for (const QString& file : files) {
+            cFileIcon icon;
+            if (icon.LoadMainIconFromEXE(file))
+                icon.SaveIcon(target);
+        }
+    });
+
+    const double n = files.size();
+    out << "figure icons_extract " << n / ours << " files/s\n";
+    out << "figure icons_read_bytes " << n / read << " files/s\n";
+    out << "ratio icons_extract_vs_read " << ours / read << '\n';
+
+    const QString wrestool = QStandardPaths::findExecutable(QStringLiteral("wrestool"));
+    if (wrestool.isEmpty()) {
+        out << "wrestool not installed: no reference\n";
+        return 0;
+    }
+    // One wrestool process per file, as a tool that extracts one game's icon at a time would run it.
+    const QString wrestoolOut = scratch.filePath(QStringLiteral("wrestool"));
+    QDir().mkpath(wrestoolOut);
+    const double reference = secondsPerPass([&] {
+        for (const QString& file : files) {
+            QProcess process;
+            process.setStandardOutputFile(QProcess::nullDevice());
+            process.setStandardErrorFile(QProcess::nullDevice());
+            process.start(wrestool, { QStringLiteral("-x"), QStringLiteral("-t"), QStringLiteral("14"),
+                                        QStringLiteral("-o"), wrestoolOut, file });
+            process.waitForFinished(-1);
+        }
+    });
+    // And all files in one wrestool process, its best case.
+    const double referenceBatch = secondsPerPass([&] {
+        QProcess process;
+        process.setStandardOutputFile(QProcess::nullDevice());
+        process.setStandardErrorFile(QProcess::nullDevice());
+        process.start(wrestool,
+            QStringList { QStringLiteral("-x"), QStringLiteral("-t"), QStringLiteral("14"), QStringLiteral("-o"),
+                wrestoolOut }
+                + files);
+        process.waitForFinished(-1);
+    });
+    out << "figure wrestool_extract " << n / reference << " files/s\n";
+    out << "figure wrestool_extract_one_process " << n / referenceBatch << " files/s\n";
+    out << "ratio icons_extract_vs_wrestool " << ours / reference << '\n';
+    out << "ratio icons_extract_vs_wrestool_one_process " << ours / referenceBatch << '\n';
+    return 0;
+}
