@@ -72,10 +72,11 @@ int main(int argc, char** argv)
     figure("settings_save",
         microsecondsPerCall(50, [&] { SaveSetting(AppTitle(), commands, key, QString::number(++n % 2)); }), "us");
     figure("added_games_500", microsecondsPerCall(50, [] { CatalogueStore::AddedGames(); }), "us");
-    figure("find_added_game_500",
-        microsecondsPerCall(
-            50, [] { CatalogueStore::FindAddedGame(QStringLiteral("/HOME/user/games/game 499/GAME499.EXE")); }),
-        "us");
+    const QString lookedUp = QStringLiteral("/HOME/user/games/game 499/GAME499.EXE");
+    figure("find_added_game_500", microsecondsPerCall(50, [&] { CatalogueStore::FindAddedGame(lookedUp); }), "us");
+    const auto index = CatalogueStore::IndexByPath(CatalogueStore::AddedGames());
+    figure("indexed_lookup_500",
+        microsecondsPerCall(20000, [&] { index.contains(CatalogueStore::NormalisedPath(lookedUp)); }), "us");
 
     clsFileBag bag;
     for (int i = 0; i < 50; ++i)

@@ -1,9 +1,8 @@
 #include "icons/PeModule.h"
 
+#include "icons/ByteReader.h"
 #include "icons/PeLayout.h"
 
-#include <QFile>
-#include <QFileInfo>
 #include <QSet>
 
 namespace Brimvault {
@@ -17,24 +16,30 @@ bool ResourceKey::matches(const ResourceKey& other) const
     return named ? name.compare(other.name, Qt::CaseInsensitive) == 0 : id == other.id;
 }
 
+PeModule::PeModule(std::unique_ptr<PeSource> source)
+    : m_source(std::move(source))
+{
+}
+
+PeModule::~PeModule() = default;
+
 PeModule::OpenResult PeModule::open(const QString& path)
 {
-    QFile file(path);
-    if (!file.open(QIODevice::ReadOnly)) {
-        const bool exists = QFileInfo::exists(path);
-        return { nullptr, exists ? PeError::AccessDenied : PeError::FileNotFound };
-    }
-    QByteArray bytes = file.readAll();
-    if (file.error() != QFileDevice::NoError)
-        return { nullptr, PeError::AccessDenied };
-    return fromBytes(std::move(bytes));
+    int platformError = 0;
+    std::unique_ptr<PeSource> source = PeSource::fromFile(path, &platformError);
+    if (!source)
+        return { nullptr, PeError(platformError) };
+    return parsed(std::move(source));
 }
 
 PeModule::OpenResult PeModule::fromBytes(QByteArray bytes)
 {
-    std::unique_ptr<PeModule> module(new PeModule);
-    module->m_bytes = std::move(bytes);
-    module->m_reader = ByteReader(QByteArrayView(module->m_bytes));
+    return parsed(PeSource::fromBytes(std::move(bytes)));
+}
+
+PeModule::OpenResult PeModule::parsed(std::unique_ptr<PeSource> source)
+{
+    std::unique_ptr<PeModule> module(new PeModule(std::move(source)));
     const PeError error = module->parse();
     if (error != PeError::None)
         return { nullptr, error };
@@ -43,40 +48,43 @@ PeModule::OpenResult PeModule::fromBytes(QByteArray bytes)
 
 PeError PeModule::parse()
 {
-    if (m_reader.u16(0) != DosMagic)
+    m_entryBudget = m_source->size() / ResDirEntrySize + 1024;
+    if (m_source->u16(0) != DosMagic)
         return PeError::BadFormat;
-    const auto peOffset = m_reader.u32(DosPeOffsetField);
-    if (!peOffset || m_reader.u32(*peOffset) != PeSignature)
+    const auto peOffset = m_source->u32(DosPeOffsetField);
+    if (!peOffset || m_source->u32(*peOffset) != PeSignature)
         return PeError::BadFormat;
     const qint64 fileHeader = qint64(*peOffset) + 4;
-    const auto sectionCount = m_reader.u16(fileHeader + FileHeaderSectionCount);
-    const auto optionalSize = m_reader.u16(fileHeader + FileHeaderOptionalSize);
+    const auto sectionCount = m_source->u16(fileHeader + FileHeaderSectionCount);
+    const auto optionalSize = m_source->u16(fileHeader + FileHeaderOptionalSize);
     if (!sectionCount || !optionalSize)
         return PeError::BadFormat;
     const qint64 optional = fileHeader + FileHeaderSize;
-    const auto magic = m_reader.u16(optional);
+    const auto magic = m_source->u16(optional);
     if (magic != OptionalMagic32 && magic != OptionalMagic64)
         return PeError::BadFormat;
     m_is64 = magic == OptionalMagic64;
     const qint64 dirCountAt = m_is64 ? Optional64DataDirCount : Optional32DataDirCount;
     const qint64 dirsAt = m_is64 ? Optional64DataDirs : Optional32DataDirs;
-    m_sizeOfHeaders = m_reader.u32(optional + OptionalSizeOfHeaders).value_or(0);
+    m_sizeOfHeaders = m_source->u32(optional + OptionalSizeOfHeaders).value_or(0);
 
     const qint64 sectionTable = optional + *optionalSize;
     for (qint64 i = 0; i < *sectionCount; ++i) {
         const qint64 at = sectionTable + i * SectionHeaderSize;
-        if (!m_reader.contains(at, SectionHeaderSize))
+        const auto header = m_source->bytes(at, SectionHeaderSize);
+        if (!header)
             return PeError::BadFormat;
-        m_sections.append({ *m_reader.u32(at + SectionVirtualAddress), *m_reader.u32(at + SectionVirtualSize),
-            *m_reader.u32(at + SectionRawSize), *m_reader.u32(at + SectionRawPointer) });
+        const ByteReader section(*header);
+        m_sections.append({ *section.u32(SectionVirtualAddress), *section.u32(SectionVirtualSize),
+            *section.u32(SectionRawSize), *section.u32(SectionRawPointer) });
     }
 
-    const auto dirCount = m_reader.u32(optional + dirCountAt);
+    const auto dirCount = m_source->u32(optional + dirCountAt);
     const qint64 resourceDir = optional + dirsAt + ResourceDataDirIndex * DataDirSize;
     // The data directory must lie inside the optional header the file header announced.
     if (dirCount && *dirCount > ResourceDataDirIndex && resourceDir + DataDirSize <= sectionTable) {
-        const quint32 rva = m_reader.u32(resourceDir).value_or(0);
-        const quint32 size = m_reader.u32(resourceDir + 4).value_or(0);
+        const quint32 rva = m_source->u32(resourceDir).value_or(0);
+        const quint32 size = m_source->u32(resourceDir + 4).value_or(0);
         if (rva != 0 && size != 0 && rvaToOffset(rva))
             m_resourceRva = rva;
     }
@@ -94,11 +102,11 @@ std::optional<qint64> PeModule::rvaToOffset(quint32 rva) const
         if (delta >= section.rawSize)
             return std::nullopt;
         const qint64 offset = qint64(section.rawPointer) + delta;
-        if (offset >= m_reader.size())
+        if (offset >= m_source->size())
             return std::nullopt;
         return offset;
     }
-    if (rva < m_sizeOfHeaders && rva < m_reader.size())
+    if (rva < m_sizeOfHeaders && rva < m_source->size())
         return qint64(rva);
     return std::nullopt;
 }
@@ -112,8 +120,8 @@ QString PeModule::resourceName(quint32 nameOffset) const
     const auto at = quint64(m_resourceRva) + nameOffset > 0xFFFFFFFFu ? std::nullopt
                                                                        : rvaToOffset(m_resourceRva + nameOffset);
     if (at) {
-        const quint16 length = qMin<quint16>(m_reader.u16(*at).value_or(0), MaxResourceNameLength);
-        const QByteArrayView chars = m_reader.bytesUpTo(*at + 2, qint64(length) * 2);
+        const quint16 length = qMin<quint16>(m_source->u16(*at).value_or(0), MaxResourceNameLength);
+        const QByteArrayView chars = m_source->bytesUpTo(*at + 2, qint64(length) * 2);
         name = QString::fromUtf16(reinterpret_cast<const char16_t*>(chars.data()), chars.size() / 2);
     }
     m_names.insert(nameOffset, name);
@@ -128,15 +136,20 @@ const PeModule::Directory& PeModule::directory(quint32 dirOffset) const
     Directory dir;
     const auto at = quint64(m_resourceRva) + dirOffset > 0xFFFFFFFFu ? std::nullopt
                                                                       : rvaToOffset(m_resourceRva + dirOffset);
-    if (at && m_reader.contains(*at, ResDirHeaderSize)) {
-        const qint64 count = qint64(*m_reader.u16(*at + ResDirNamedCount)) + *m_reader.u16(*at + ResDirIdCount);
+    const auto header = at ? m_source->bytes(*at, ResDirHeaderSize) : std::nullopt;
+    if (header) {
+        const ByteReader headerReader(*header);
+        const qint64 count = qint64(*headerReader.u16(ResDirNamedCount)) + *headerReader.u16(ResDirIdCount);
         const qint64 first = *at + ResDirHeaderSize;
         // A count running past the end of the file lists what is there.
-        const qint64 available = qMin(count, (m_reader.size() - first) / ResDirEntrySize);
+        const qint64 available
+            = qBound<qint64>(0, qMin(count, (m_source->size() - first) / ResDirEntrySize), m_entryBudget);
+        m_entryBudget -= available;
+        const ByteReader table(m_source->bytes(first, available * ResDirEntrySize).value_or(QByteArrayView()));
         QList<DirEntry> ids;
-        for (qint64 i = 0; i < available; ++i) {
-            const quint32 name = *m_reader.u32(first + i * ResDirEntrySize);
-            const quint32 target = *m_reader.u32(first + i * ResDirEntrySize + 4);
+        for (qint64 i = 0; i < table.size() / ResDirEntrySize; ++i) {
+            const quint32 name = *table.u32(i * ResDirEntrySize);
+            const quint32 target = *table.u32(i * ResDirEntrySize + 4);
             DirEntry entry { {}, (target & ResHighBit) != 0, target & ~ResHighBit };
             if (name & ResHighBit) {
                 entry.key = ResourceKey::fromName(resourceName(name & ~ResHighBit));
@@ -202,13 +215,15 @@ std::optional<ResourceLeaf> PeModule::leafAt(quint32 dataEntryOffset) const
     if (quint64(m_resourceRva) + dataEntryOffset > 0xFFFFFFFFu)
         return std::nullopt;
     const auto at = rvaToOffset(m_resourceRva + dataEntryOffset);
-    if (!at || !m_reader.contains(*at, ResDataEntrySize))
+    const auto entry = at ? m_source->bytes(*at, ResDataEntrySize) : std::nullopt;
+    if (!entry)
         return std::nullopt;
+    const ByteReader entryReader(*entry);
     ResourceLeaf leaf;
-    leaf.dataRva = *m_reader.u32(*at);
-    leaf.size = *m_reader.u32(*at + 4);
+    leaf.dataRva = *entryReader.u32(0);
+    leaf.size = *entryReader.u32(4);
     const auto offset = rvaToOffset(leaf.dataRva);
-    if (offset && m_reader.contains(*offset, leaf.size))
+    if (offset && m_source->contains(*offset, leaf.size))
         leaf.fileOffset = *offset;
     return leaf;
 }
@@ -236,7 +251,7 @@ std::optional<PeModule::Found> PeModule::findResource(const ResourceKey& type, c
     Found found;
     found.size = leaf->size;
     if (leaf->fileOffset >= 0)
-        found.data = m_reader.bytes(leaf->fileOffset, leaf->size);
+        found.data = m_source->bytes(leaf->fileOffset, leaf->size);
     return found;
 }
 

@@ -1,6 +1,6 @@
 #pragma once
 
-#include "icons/ByteReader.h"
+#include "icons/PeSource.h"
 
 #include <QByteArray>
 #include <QHash>
@@ -54,6 +54,7 @@ public:
     };
     static OpenResult open(const QString& path);
     static OpenResult fromBytes(QByteArray bytes);
+    ~PeModule();
 
     bool is64Bit() const { return m_is64; }
     bool hasResources() const { return m_resourceRva != 0; }
@@ -92,6 +93,8 @@ private:
         QHash<QString, qsizetype> byUpperName;
     };
 
+    explicit PeModule(std::unique_ptr<PeSource> source);
+    static OpenResult parsed(std::unique_ptr<PeSource> source);
     PeError parse();
     const Directory& directory(quint32 dirOffset) const;
     const QList<DirEntry>& directoryEntries(quint32 dirOffset) const { return directory(dirOffset).entries; }
@@ -99,8 +102,7 @@ private:
     std::optional<ResourceLeaf> leafAt(quint32 dataEntryOffset) const;
     QString resourceName(quint32 nameOffset) const;
 
-    QByteArray m_bytes;
-    ByteReader m_reader;
+    std::unique_ptr<PeSource> m_source;
     bool m_is64 = false;
     quint32 m_sizeOfHeaders = 0;
     QList<Section> m_sections;
@@ -108,6 +110,9 @@ private:
     // Parsed once: lookups by id or name stay cheap however many resources a file declares.
     mutable QHash<quint32, Directory> m_directories;
     mutable QHash<quint32, QString> m_names;
+    // Directories of a real file never overlap, so their entries fit in the file; crafted overlapping ones could
+    // otherwise make the walk quadratic in the file's size.
+    mutable qint64 m_entryBudget = 0;
 };
 
 } // namespace Brimvault

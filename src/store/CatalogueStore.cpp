@@ -7,11 +7,6 @@ namespace Brimvault::CatalogueStore {
 
 namespace {
 
-QString normalisedPath(const QString& path)
-{
-    return path.trimmed().toLower();
-}
-
 bool isCounterKey(const QString& key)
 {
     return key.trimmed().toLower() == QLatin1String("count");
@@ -59,9 +54,26 @@ QString AddGame(const QString& path)
     return key;
 }
 
+QString NormalisedPath(const QString& path)
+{
+    return path.trimmed().toLower();
+}
+
+QHash<QString, AddedGame> IndexByPath(const QList<AddedGame>& games)
+{
+    QHash<QString, AddedGame> index;
+    index.reserve(games.size());
+    for (const AddedGame& game : games) {
+        const QString path = NormalisedPath(game.path);
+        if (!index.contains(path))
+            index.insert(path, game);
+    }
+    return index;
+}
+
 bool SamePath(const QString& a, const QString& b)
 {
-    return normalisedPath(a) == normalisedPath(b);
+    return NormalisedPath(a) == NormalisedPath(b);
 }
 
 std::optional<AddedGame> FindAddedGame(const QList<AddedGame>& games, const QString& path)

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <QHash>
 #include <QList>
 #include <QString>
 #include <optional>
@@ -26,6 +27,11 @@ QString AddGame(const QString& path);
 // The entry whose path matches, ignoring letter case and surrounding blanks.
 std::optional<AddedGame> FindAddedGame(const QString& path);
 std::optional<AddedGame> FindAddedGame(const QList<AddedGame>& games, const QString& path);
+
+// Lookups for many paths at once (list building): the first entry for each path, keyed by NormalisedPath.
+QHash<QString, AddedGame> IndexByPath(const QList<AddedGame>& games);
+// Trimmed and in lower case, the form in which paths are compared.
+QString NormalisedPath(const QString& path);
 
 // Deletes the entry and the user's display name for it; the counter stays.
 void RemoveGame(const QString& fileKey);

@@ -159,22 +159,39 @@ qsizetype IniDocument::sectionEnd(qsizetype sectionLine) const
     return qsizetype(i);
 }
 
+// A section may appear more than once (joined by hand, or spelt in two cases): it is read as one.
+qsizetype IniDocument::findEntry(const QString& section, const QString& key) const
+{
+    bool inSection = false;
+    for (size_t i = 0; i < m_lines.size(); ++i) {
+        const Line& line = m_lines[i];
+        if (line.kind == Line::Section)
+            inSection = sameName(line.name, section);
+        else if (inSection && line.kind == Line::Entry && sameName(line.name, key))
+            return qsizetype(i);
+    }
+    return -1;
+}
+
 std::optional<QString> IniDocument::value(const QString& section, const QString& key) const
 {
-    const qsizetype s = findSection(section);
-    if (s < 0)
+    const qsizetype entry = findEntry(section, key);
+    if (entry < 0)
         return std::nullopt;
-    const qsizetype end = sectionEnd(s);
-    for (qsizetype i = s + 1; i < end; ++i) {
-        const Line& line = m_lines[size_t(i)];
-        if (line.kind == Line::Entry && sameName(line.name, key))
-            return line.value;
-    }
-    return std::nullopt;
+    return m_lines[size_t(entry)].value;
 }
 
 void IniDocument::setValue(const QString& section, const QString& key, const QString& value)
 {
+    const qsizetype entry = findEntry(section, key);
+    if (entry >= 0) {
+        Line& line = m_lines[size_t(entry)];
+        if (line.value != value) {
+            line.value = value; // keep the stored spelling of the key
+            line.modified = true;
+        }
+        return;
+    }
     qsizetype s = findSection(section);
     if (s < 0) {
         if (!m_lines.empty() && !(m_lines.back().kind == Line::Raw && m_lines.back().raw.trimmed().isEmpty()))
@@ -182,18 +199,7 @@ void IniDocument::setValue(const QString& section, const QString& key, const QSt
         m_lines.push_back(Line {Line::Section, section, {}, {}, true});
         s = qsizetype(m_lines.size()) - 1;
     }
-    const qsizetype end = sectionEnd(s);
-    qsizetype insertAt = end;
-    for (qsizetype i = s + 1; i < end; ++i) {
-        Line& line = m_lines[size_t(i)];
-        if (line.kind == Line::Entry && sameName(line.name, key)) {
-            if (line.value != value) {
-                line.value = value; // keep the stored spelling of the key
-                line.modified = true;
-            }
-            return;
-        }
-    }
+    qsizetype insertAt = sectionEnd(s);
     // New entries go after the section's last entry, before any blank lines that separate it from the next one.
     while (insertAt > s + 1 && m_lines[size_t(insertAt - 1)].kind == Line::Raw
         && m_lines[size_t(insertAt - 1)].raw.trimmed().isEmpty())
@@ -239,13 +245,11 @@ bool IniDocument::removeSection(const QString& section)
 QList<QPair<QString, QString>> IniDocument::sectionPairs(const QString& section) const
 {
     QList<QPair<QString, QString>> pairs;
-    const qsizetype s = findSection(section);
-    if (s < 0)
-        return pairs;
-    const qsizetype end = sectionEnd(s);
-    for (qsizetype i = s + 1; i < end; ++i) {
-        const Line& line = m_lines[size_t(i)];
-        if (line.kind == Line::Entry)
+    bool inSection = false;
+    for (const Line& line : m_lines) {
+        if (line.kind == Line::Section)
+            inSection = sameName(line.name, section);
+        else if (inSection && line.kind == Line::Entry)
             pairs.append({line.name, line.value});
     }
     return pairs;

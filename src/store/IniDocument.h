@@ -9,8 +9,9 @@
 
 namespace Brimvault {
 
-// One settings file held as its lines. Lines that do not parse (hand edits, garbage, another encoding)
-// are kept byte for byte and written back unchanged, so a damaged file never loses what it held.
+// One settings file held as its lines. Every line that no change touched (hand edits, garbage, another
+// encoding, its own line end) is written back byte for byte, so a damaged file never loses what it held.
+// A section that appears more than once is read as one.
 class IniDocument {
 public:
     static IniDocument parse(const QByteArray& bytes);
@@ -35,6 +36,8 @@ private:
     // Index of the section line, or -1.
     qsizetype findSection(const QString& section) const;
     qsizetype sectionEnd(qsizetype sectionLine) const;
+    // Index of the key's first Entry line in any section of that name, or -1.
+    qsizetype findEntry(const QString& section, const QString& key) const;
 
     std::vector<Line> m_lines;
     QByteArray m_lineEnd = "\n"; // for new lines: the line end of the file's first line

@@ -4,6 +4,7 @@
 
 #include <QDir>
 #include <QFile>
+#include <QFileInfo>
 #include <QHash>
 #include <QMutex>
 #include <QSaveFile>
@@ -117,9 +118,13 @@ enum class ReadState { Missing, Read, Unreadable };
 
 ReadState readBytes(const QString& path, QByteArray& bytes)
 {
-    QFile file(path);
-    if (!file.exists())
+    const QFileInfo info(path);
+    if (!info.exists())
         return ReadState::Missing;
+    // A folder, a pipe or a device in the file's place is never read: a pipe would block the reader.
+    if (!info.isFile())
+        return ReadState::Unreadable;
+    QFile file(path);
     if (!file.open(QIODevice::ReadOnly))
         return ReadState::Unreadable;
     bytes = file.readAll();

@@ -82,16 +82,29 @@ QStringList nameVariants(const QString& name)
     return variants;
 }
 
-std::optional<ResolvedCommand> commandFor(const QString& program, QStringList arguments)
+std::optional<ResolvedCommand> commandFor(
+    const QString& program, QStringList arguments, const QString& compatibilityRunner)
 {
 #ifndef Q_OS_WIN
     if (isWindowsExecutable(program)) {
-        const QString runner = findExactly(QStringLiteral("wine"));
-        if (runner.isEmpty())
+        std::optional<ResolvedCommand> runner;
+        if (compatibilityRunner.trimmed().isEmpty()) {
+            const QString wine = findExactly(QStringLiteral("wine"));
+            if (!wine.isEmpty())
+                runner = ResolvedCommand {wine, {}};
+        } else {
+            // The runner is resolved without one of its own, so a runner that is itself a Windows program can
+            // only go through wine, never back to itself.
+            runner = ResolveCommandLine(compatibilityRunner, QString());
+        }
+        if (!runner)
             return std::nullopt;
-        arguments.prepend(program);
-        return ResolvedCommand {runner, arguments};
+        runner->arguments.append(program);
+        runner->arguments.append(arguments);
+        return runner;
     }
+#else
+    Q_UNUSED(compatibilityRunner);
 #endif
     return ResolvedCommand {program, arguments};
 }
@@ -110,6 +123,11 @@ QString FindProgram(const QString& name)
 
 std::optional<ResolvedCommand> ResolveCommandLine(const QString& commandLine)
 {
+    return ResolveCommandLine(commandLine, QString());
+}
+
+std::optional<ResolvedCommand> ResolveCommandLine(const QString& commandLine, const QString& compatibilityRunner)
+{
     const QString line = commandLine.trimmed();
     if (line.isEmpty())
         return std::nullopt;
@@ -118,11 +136,11 @@ std::optional<ResolvedCommand> ResolveCommandLine(const QString& commandLine)
         for (qsizetype blank = line.indexOf(u' '); blank > 0; blank = line.indexOf(u' ', blank + 1)) {
             const QString program = FindProgram(line.left(blank));
             if (!program.isEmpty())
-                return commandFor(program, QProcess::splitCommand(line.mid(blank + 1)));
+                return commandFor(program, QProcess::splitCommand(line.mid(blank + 1)), compatibilityRunner);
         }
         const QString program = FindProgram(line);
         if (!program.isEmpty())
-            return commandFor(program, {});
+            return commandFor(program, {}, compatibilityRunner);
         return std::nullopt;
     }
 
@@ -132,12 +150,17 @@ std::optional<ResolvedCommand> ResolveCommandLine(const QString& commandLine)
     const QString program = FindProgram(words.takeFirst());
     if (program.isEmpty())
         return std::nullopt;
-    return commandFor(program, words);
+    return commandFor(program, words, compatibilityRunner);
 }
 
 std::optional<qint64> StartCommandLine(const QString& commandLine, int windowStyle)
 {
-    const std::optional<ResolvedCommand> command = ResolveCommandLine(commandLine);
+    return StartCommandLine(commandLine, windowStyle, QString());
+}
+
+std::optional<qint64> StartCommandLine(const QString& commandLine, int windowStyle, const QString& compatibilityRunner)
+{
+    const std::optional<ResolvedCommand> command = ResolveCommandLine(commandLine, compatibilityRunner);
     if (!command)
         return std::nullopt;
     QProcess process;

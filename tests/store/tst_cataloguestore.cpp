@@ -22,6 +22,7 @@ private Q_SLOTS:
     void counterIsSkipped();
     void pathLookup_data();
     void pathLookup();
+    void firstEntryWins();
     void displayNames();
     void removeAllKeepsDisplayNames();
     void gameInfoFileName_data();
@@ -153,10 +154,27 @@ void TestCatalogueStore::pathLookup()
     const QString key = CatalogueStore::AddGame(stored);
     const auto game = CatalogueStore::FindAddedGame(lookedUp);
     QCOMPARE(game.has_value(), found);
+    const auto index = CatalogueStore::IndexByPath(CatalogueStore::AddedGames());
+    const auto indexed = index.constFind(CatalogueStore::NormalisedPath(lookedUp));
+    QCOMPARE(indexed != index.constEnd(), found);
     if (found) {
         QCOMPARE(game->key, key);
         QCOMPARE(game->path, stored);
+        QCOMPARE(indexed->key, key);
     }
+}
+
+// The same game added twice is found under its first entry, by either lookup.
+void TestCatalogueStore::firstEntryWins()
+{
+    TestEnvironment env;
+    CatalogueStore::AddGame(u"/g/other.exe"_qs);
+    CatalogueStore::AddGame(u"/g/Twice.exe"_qs);
+    CatalogueStore::AddGame(u" /G/twice.exe"_qs);
+    QCOMPARE(CatalogueStore::FindAddedGame(u"/g/twice.exe"_qs)->key, u"File2"_qs);
+    const auto index = CatalogueStore::IndexByPath(CatalogueStore::AddedGames());
+    QCOMPARE(index.size(), 2);
+    QCOMPARE(index.value(u"/g/twice.exe"_qs).key, u"File2"_qs);
 }
 
 void TestCatalogueStore::displayNames()

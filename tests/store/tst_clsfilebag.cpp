@@ -7,6 +7,10 @@
 #include <QFile>
 #include <QtTest>
 
+#ifdef Q_OS_UNIX
+#include <sys/stat.h>
+#endif
+
 using namespace Brimvault;
 
 class TestClsFileBag : public QObject {
@@ -43,7 +47,8 @@ private Q_SLOTS:
     void openFile_data();
     void openFile();
     void openFileMissingOrEmptyName();
-    void directoryAsFileName();
+    void notAPlainFile_data();
+    void notAPlainFile();
     void hugeLine();
     void oversizedFileIsLeftAlone();
     void saveWritesTextExactly();
@@ -507,20 +512,42 @@ void TestClsFileBag::openFileMissingOrEmptyName()
     QVERIFY(!bag.Changed());
 }
 
-void TestClsFileBag::directoryAsFileName()
+void TestClsFileBag::notAPlainFile_data()
 {
+    QTest::addColumn<QString>("kind");
+    QTest::newRow("folder") << u"folder"_qs;
+#ifdef Q_OS_UNIX
+    QTest::newRow("named pipe") << u"fifo"_qs;
+    QTest::newRow("endless device") << u"device"_qs;
+#endif
+}
+
+// Neither reading nor saving may hang, fill the memory or replace what the bag could not read.
+void TestClsFileBag::notAPlainFile()
+{
+    QFETCH(QString, kind);
     TestEnvironment env;
-    const QString folder = env.path(u"folder.bvxinf"_qs);
-    QVERIFY(QDir().mkpath(folder + u"/inside"_qs));
+    QString name = env.path(u"odd.bvxinf"_qs);
+    if (kind == u"folder") {
+        QVERIFY(QDir().mkpath(name + u"/inside"_qs));
+#ifdef Q_OS_UNIX
+    } else if (kind == u"fifo") {
+        QCOMPARE(::mkfifo(QFile::encodeName(name).constData(), 0600), 0);
+    } else {
+        name = u"/dev/zero"_qs;
+#endif
+    }
     clsFileBag bag;
-    QVERIFY(!bag.OpenFile(folder));
+    QVERIFY(!bag.OpenFile(name));
     QVERIFY(bag.CurrentFileText().isEmpty());
-    // Neither an empty nor a changed bag may replace what it could not read.
     QVERIFY(!bag.SaveFile());
     bag.SetRecord(u"<>a<"_qs, u"1"_qs);
     QVERIFY(!bag.SaveFile());
     QVERIFY(bag.Changed());
-    QVERIFY(QFileInfo(folder + u"/inside"_qs).isDir());
+    if (kind == u"folder")
+        QVERIFY(QFileInfo(name + u"/inside"_qs).isDir());
+    else
+        QVERIFY(QFileInfo::exists(name));
 }
 
 void TestClsFileBag::hugeLine()

@@ -8,6 +8,10 @@
 #include <QProcess>
 #include <QtTest>
 
+#ifdef Q_OS_UNIX
+#include <sys/stat.h>
+#endif
+
 using namespace Brimvault;
 
 class TestSettingsStore : public QObject {
@@ -22,11 +26,13 @@ private Q_SLOTS:
     void enumerationOrder();
     void handEditedFile_data();
     void handEditedFile();
+    void splitSectionReadsAsOne();
     void secondProcessWriteIsSeenAtOnce();
     void concurrentWritersLoseNothing();
     void corruptFileKeepsItsBytes();
     void unchangedLinesKeepTheirBytes();
-    void settingsPathIsADirectory();
+    void settingsPathIsNotAFile_data();
+    void settingsPathIsNotAFile();
 };
 
 namespace {
@@ -181,6 +187,8 @@ void TestSettingsStore::handEditedFile_data()
     QTest::newRow("blanks around header") << QByteArray("[Other]\nCount=1\n  [Files] \nCount=3") << u"3"_qs;
     QTest::newRow("comment") << QByteArray("[Files]\n;Count=1\nCount=3") << u"3"_qs;
     QTest::newRow("garbage before") << QByteArrayLiteral("\xff\xfe\x00\n[Files]\nCount=3") << u"3"_qs;
+    QTest::newRow("section split in two")
+        << QByteArray("[Files]\nFile1=a\n[Other]\nCount=1\n[FILES]\nCount=3") << u"3"_qs;
     QTest::newRow("entry before any section") << QByteArray("Count=1\n[Files]\n") << u"none"_qs;
     QTest::newRow("invalid UTF-8 entry") << QByteArray("[Files]\nCount=\xe9\n") << u"none"_qs;
 }
@@ -192,6 +200,20 @@ void TestSettingsStore::handEditedFile()
     TestEnvironment env;
     writeBytes(env.settingsFile(), bytes);
     QCOMPARE(GetSetting(AppTitle(), files, u"count"_qs, u"none"_qs), value);
+}
+
+void TestSettingsStore::splitSectionReadsAsOne()
+{
+    TestEnvironment env;
+    writeBytes(env.settingsFile(), "[Files]\nFile1=/a\n[Other]\nx=1\n[files]\nFile2=/b\n");
+    QVERIFY(SaveSetting(AppTitle(), files, u"file2"_qs, u"/c"_qs));
+    QVERIFY(SaveSetting(AppTitle(), files, u"File3"_qs, u"/d"_qs));
+    const QList<QPair<QString, QString>> expected {
+        {u"File1"_qs, u"/a"_qs}, {u"File3"_qs, u"/d"_qs}, {u"File2"_qs, u"/c"_qs}};
+    QCOMPARE(GetAllSettings(AppTitle(), files), expected);
+    QVERIFY(DeleteSection(AppTitle(), files));
+    QVERIFY(GetAllSettings(AppTitle(), files).isEmpty());
+    QCOMPARE(GetSetting(AppTitle(), u"Other"_qs, u"x"_qs), u"1"_qs);
 }
 
 void TestSettingsStore::secondProcessWriteIsSeenAtOnce()
@@ -280,21 +302,40 @@ void TestSettingsStore::unchangedLinesKeepTheirBytes()
         QByteArray("; written by hand\n[Files]\nCount = 1\nFile1=a\\zb\n\n[Names]\nN=y\n"));
 }
 
-void TestSettingsStore::settingsPathIsADirectory()
+void TestSettingsStore::settingsPathIsNotAFile_data()
 {
+    QTest::addColumn<bool>("folder");
+    QTest::newRow("folder") << true;
+#ifdef Q_OS_UNIX
+    QTest::newRow("named pipe") << false;
+#endif
+}
+
+// Defaults for every read, failure for every write, and nothing in the way is destroyed or blocks.
+void TestSettingsStore::settingsPathIsNotAFile()
+{
+    QFETCH(bool, folder);
     TestEnvironment env;
     const QString inside = env.settingsFile() + u"/keep.txt"_qs;
-    QVERIFY(QDir().mkpath(env.settingsFile()));
-    writeBytes(inside, "precious");
+    if (folder) {
+        QVERIFY(QDir().mkpath(env.settingsFile()));
+        writeBytes(inside, "precious");
+    } else {
+#ifdef Q_OS_UNIX
+        QCOMPARE(::mkfifo(QFile::encodeName(env.settingsFile()).constData(), 0600), 0);
+#endif
+    }
     QCOMPARE(GetSetting(AppTitle(), files, u"Count"_qs, u"0"_qs), u"0"_qs);
     QVERIFY(GetAllSettings(AppTitle(), files).isEmpty());
     QVERIFY(!SaveSetting(AppTitle(), files, u"Count"_qs, u"1"_qs));
     QVERIFY(!DeleteSetting(AppTitle(), files, u"Count"_qs));
     QVERIFY(!DeleteSection(AppTitle(), files));
-    QVERIFY(QFileInfo(env.settingsFile()).isDir());
-    QCOMPARE(readBytes(inside), QByteArray("precious"));
     QCOMPARE(runWriter({u"set"_qs, files, u"Count"_qs, u"1"_qs}), 1);
-    QCOMPARE(readBytes(inside), QByteArray("precious"));
+    const QFileInfo info(env.settingsFile());
+    QVERIFY(info.exists());
+    QCOMPARE(info.isDir(), folder);
+    if (folder)
+        QCOMPARE(readBytes(inside), QByteArray("precious"));
 }
 
 QTEST_GUILESS_MAIN(TestSettingsStore)

@@ -1,39 +1,256 @@
 #include "ui/main/frmMain.h"
 
+#include "catalogue/IconCacheBuilder.h"
+#include "catalogue/ListBuilder.h"
+#include "gameactions/PackageInstallCommand.h"
+#include "i18n/ApplyLanguage.h"
+#include "i18n/modLocalizer.h"
+#include "store/DataFolders.h"
 #include "store/SettingsStore.h"
+#include "support/CommandLine.h"
+#include "ui/listview/ImageCtrl.h"
+#include "ui/listview/SimpleListView.h"
+#include "ui/main/ClickLabel.h"
+#include "ui/main/FormScaling.h"
+#include "ui/main/MainWindowDesign.h"
+#include "ui/main/QuilletCalls.h"
+#include "ui/main/StockPictures.h"
 
-#include <QFont>
-#include <QLabel>
-#include <QListWidget>
-#include <QVBoxLayout>
+#include <QCloseEvent>
+#include <QCoreApplication>
+#include <QLinearGradient>
+#include <QPainter>
+#include <QScopeGuard>
+#include <QTimer>
 
 namespace Brimvault {
 
+namespace {
+
+QFont fontWithFallbacks(const QFont& base, const QStringList& families, qreal pointSize)
+{
+    QFont font = base;
+    font.setFamilies(families);
+    font.setPointSizeF(pointSize);
+    return font;
+}
+
+} // namespace
+
 frmMain::frmMain(QWidget* parent)
     : QWidget(parent)
+    , m_builder(std::make_unique<ListBuilder>(DataFolders::IconsFolder()))
+    , m_iconBuilder(std::make_unique<IconCacheBuilder>(DataFolders::IconsFolder()))
+    , m_installFolder(std::make_unique<InstallFolderMemory>())
 {
     setObjectName(QStringLiteral("frmMain"));
-    setWindowTitle(AppTitle());
-    resize(800, 600);
+    setWindowIcon(StockPictures::ProgramIcon());
+    createControls();
+    createMenus();
+    connectGameActions();
+    connectMediaHost();
+    placeControls();
 
-    m_productName = new QLabel(AppTitle(), this);
-    m_productName->setObjectName(QStringLiteral("Label3"));
-    QFont titleFont(QStringLiteral("Arial Black"));
-    titleFont.setPointSize(20);
-    m_productName->setFont(titleFont);
-
-    m_listView = new QListWidget(this);
-    m_listView->setObjectName(QStringLiteral("ListView1"));
-    m_listView->setViewMode(QListView::IconMode);
-    m_listView->setResizeMode(QListView::Adjust);
-    m_listView->setMovement(QListView::Static);
-    m_listView->setIconSize(QSize(48, 48));
-
-    auto* layout = new QVBoxLayout(this);
-    layout->addWidget(m_productName);
-    layout->addWidget(m_listView, 1);
+    // Loading, up to the list: captions, the screen's resolution, the centre of the screen. The list is
+    // filled once the window shows, so that the user watches it fill.
+    modLocalizer::ApplyLanguage(this, true);
+    FormScaling::ScaleForm(this, FormScaling::ScreenFactors(FormScaling::ScreenTwipsPerPixel(this)));
+    m_actionsRightMargin = width() - m_labActions->geometry().right();
+    QuilletCalls::CenterForm(this);
 }
 
 frmMain::~frmMain() = default;
+
+void frmMain::createControls()
+{
+    m_label2 = new QLabel(this);
+    m_label2->setObjectName(QStringLiteral("Label2"));
+    m_label3 = new QLabel(this);
+    m_label3->setObjectName(QStringLiteral("Label3"));
+    m_label4 = new QLabel(this);
+    m_label4->setObjectName(QStringLiteral("Label4"));
+
+    // Label2 lies under Label3, a little offset, as its shadow.
+    const QStringList titleFamilies {QStringLiteral("Arial Black"), QStringLiteral("Arial"),
+        QStringLiteral("Liberation Sans"), QStringLiteral("DejaVu Sans")};
+    QFont titleFont = fontWithFallbacks(font(), titleFamilies, MainWindowDesign::TitlePointSize);
+    titleFont.setWeight(QFont::Black);
+    m_label2->setFont(titleFont);
+    m_label3->setFont(titleFont);
+    m_label2->setStyleSheet(QStringLiteral("color: rgba(10, 20, 50, 150);"));
+    m_label3->setStyleSheet(QStringLiteral("color: white;"));
+
+    QFont copyrightFont = fontWithFallbacks(font(),
+        {QStringLiteral("Times New Roman"), QStringLiteral("Liberation Serif"), QStringLiteral("DejaVu Serif")},
+        MainWindowDesign::CopyrightPointSize);
+    copyrightFont.setItalic(true);
+    m_label4->setFont(copyrightFont);
+    m_label4->setStyleSheet(QStringLiteral("color: rgb(206, 218, 242);"));
+
+    m_imgActions = new ClickLabel(this);
+    m_imgActions->setObjectName(QStringLiteral("imgActions"));
+    m_imgActions->setPixmap(StockPictures::ActionsButton(MainWindowDesign::ActionsImageSize));
+    m_labActions = new ClickLabel(this);
+    m_labActions->setObjectName(QStringLiteral("labActions"));
+    QFont actionsFont = font();
+    actionsFont.setPointSizeF(MainWindowDesign::ActionsPointSize);
+    actionsFont.setBold(true);
+    m_labActions->setFont(actionsFont);
+    m_labActions->setStyleSheet(
+        QStringLiteral("QLabel { color: white; } QLabel:hover { color: rgb(255, 214, 120); }"));
+    m_labActions->setAlignment(Qt::AlignLeft | Qt::AlignVCenter);
+    connect(m_imgActions, &ClickLabel::Click, this, &frmMain::ShowActionsMenu);
+    connect(m_labActions, &ClickLabel::Click, this, &frmMain::ShowActionsMenu);
+
+    const auto hiddenImage = [this](const char* name, const QPixmap& picture) {
+        auto* image = new ImageCtrl(this);
+        image->setObjectName(QString::fromLatin1(name));
+        image->SetPicture(picture);
+        image->hide();
+        return image;
+    };
+    m_imgOnLine = hiddenImage("imgOnLine", StockPictures::OnlineGames());
+    m_imgSWF = hiddenImage("imgSWF", StockPictures::FlashMovie());
+    m_imgNoIcon = hiddenImage("imgNoIcon", StockPictures::NoIcon());
+    m_imgGbStels = hiddenImage("imgGbStels", StockPictures::GbStels());
+
+    m_listView = new SimpleListView(this);
+    m_listView->setObjectName(QStringLiteral("ListView1"));
+    m_listView->SetOLEDropMode(1);
+
+    m_tmrIcons = new QTimer(this);
+    m_tmrIcons->setObjectName(QStringLiteral("tmrIcons"));
+    m_tmrIcons->setInterval(MainWindowDesign::IconTimerIntervalMs);
+    m_tmrIcons->setSingleShot(true);
+    connect(m_tmrIcons, &QTimer::timeout, this, &frmMain::tmrIconsTimer);
+}
+
+void frmMain::placeControls()
+{
+    using namespace MainWindowDesign;
+    const FormScaling::TwipsPerPixel screen = FormScaling::ScreenTwipsPerPixel(this);
+    resize(FormScaling::TwipsToPixels(FormTwips, screen).size());
+    m_label2->setGeometry(FormScaling::TwipsToPixels(Label2Twips, screen));
+    m_label3->setGeometry(FormScaling::TwipsToPixels(Label3Twips, screen));
+    m_label4->setGeometry(FormScaling::TwipsToPixels(Label4Twips, screen));
+    m_imgActions->setGeometry(FormScaling::TwipsToPixels(ImgActionsTwips, screen));
+    m_labActions->setGeometry(FormScaling::TwipsToPixels(LabActionsTwips, screen));
+    m_listView->setGeometry(FormScaling::TwipsToPixels(ListViewTwips, screen));
+    for (ImageCtrl* image : {m_imgOnLine, m_imgSWF, m_imgNoIcon, m_imgGbStels})
+        image->setGeometry(FormScaling::TwipsToPixels(HiddenImageTwips, screen));
+}
+
+void frmMain::ChangeLocalizeCaptions()
+{
+    using modLocalizer::Translate;
+    const QString productName = Translate(1020, AppTitle());
+    m_labActions->setText(Translate(1010, QStringLiteral("Actions")));
+    m_label2->setText(productName);
+    m_label3->setText(productName);
+    m_label4->setText(Translate(690));
+    setWindowTitle(productName);
+    captionMenus();
+}
+
+void frmMain::showEvent(QShowEvent* event)
+{
+    QWidget::showEvent(event);
+    if (m_loaded)
+        return;
+    m_loaded = true;
+    QTimer::singleShot(0, this, &frmMain::formLoad);
+}
+
+void frmMain::formLoad()
+{
+    enterBusy();
+    const auto idle = qScopeGuard([this] { leaveBusy(); });
+    QCoreApplication::processEvents();
+    if (m_closing)
+        return;
+    RebuildList();
+    if (m_closing)
+        return;
+    StartCommandLine(MainWindowDesign::ServiceUpdateCommand, 0);
+}
+
+void frmMain::resizeEvent(QResizeEvent* event)
+{
+    QWidget::resizeEvent(event);
+    layoutListView();
+    keepActionsButtonAtRightEdge();
+}
+
+void frmMain::layoutListView()
+{
+    const QRect target = MainWindowDesign::ListViewGeometry(size(), FormScaling::ScreenTwipsPerPixel(this));
+    if (target.width() <= 0 || target.height() <= 0)
+        return;
+    // Updates held back instead of hiding the list, which would take the keyboard focus away from it.
+    m_listView->setUpdatesEnabled(false);
+    m_listView->setGeometry(target);
+    m_listView->setUpdatesEnabled(true);
+    m_listView->show();
+}
+
+void frmMain::keepActionsButtonAtRightEdge()
+{
+    if (m_actionsRightMargin <= 0)
+        return;
+    const int shift = width() - m_actionsRightMargin - m_labActions->geometry().right();
+    if (shift == 0)
+        return;
+    const int imageLeft = m_imgActions->x() + shift;
+    const int labelLeft = m_labActions->x() + shift;
+    // The button stays clear of the title when the window gets narrow.
+    if (imageLeft < m_label3->x() + m_label3->fontMetrics().horizontalAdvance(m_label3->text()) + 16)
+        return;
+    m_imgActions->move(imageLeft, m_imgActions->y());
+    m_labActions->move(labelLeft, m_labActions->y());
+}
+
+void frmMain::closeEvent(QCloseEvent* event)
+{
+    if (!m_closing) {
+        m_closing = true;
+        m_closedByUser = event->spontaneous();
+        m_tmrIcons->stop();
+        Q_EMIT closing();
+    }
+    event->accept();
+}
+
+void frmMain::enterBusy()
+{
+    ++m_busy;
+}
+
+void frmMain::leaveBusy()
+{
+    if (--m_busy == 0 && m_deleteWhenIdle)
+        deleteLater();
+}
+
+bool frmMain::event(QEvent* event)
+{
+    if (event->type() == QEvent::DeferredDelete && m_busy > 0) {
+        m_deleteWhenIdle = true;
+        return true;
+    }
+    return QWidget::event(event);
+}
+
+void frmMain::paintEvent(QPaintEvent*)
+{
+    QPainter painter(this);
+    const int bandBottom = std::max(0, std::min(m_listView->y(), height()) - MainWindowDesign::BandGapPixels);
+    painter.fillRect(rect(), MainWindowDesign::FrameColor());
+    QLinearGradient band(0, 0, 0, bandBottom);
+    band.setColorAt(0, MainWindowDesign::BandTopColor());
+    band.setColorAt(1, MainWindowDesign::BandBottomColor());
+    painter.fillRect(QRect(0, 0, width(), bandBottom), band);
+    painter.setPen(MainWindowDesign::BandEdgeColor());
+    painter.drawLine(0, bandBottom, width(), bandBottom);
+}
 
 } // namespace Brimvault

@@ -1,6 +1,6 @@
 // Writes settings from a second process, for the settings store tests.
-//   settingswriter set <section> <key> <value>
-//   settingswriter many <section> <keyPrefix> <count>     writes keyPrefix0 .. keyPrefix<count-1>
+//   settingsstore_writer set <section> <key> <value>
+//   settingsstore_writer many <section> <keyPrefix> <count>     writes keyPrefix0 .. keyPrefix<count-1>
 #include "store/SettingsStore.h"
 
 #include <QCoreApplication>

@@ -1,0 +1,66 @@
+#include "catalogue/AddedGamesSnapshot.h"
+
+#include "store/CatalogueKeys.h"
+#include "store/SettingsStore.h"
+
+namespace Brimvault {
+
+namespace {
+
+QString normalised(const QString& path)
+{
+    return path.trimmed().toLower();
+}
+
+} // namespace
+
+void AddedGamesSnapshot::read()
+{
+    m_games.clear();
+    m_keyByPath.clear();
+    m_nameByKey.clear();
+    m_count = 0;
+    const auto files = GetAllSettings(AppTitle(), CatalogueKeys::FilesSection);
+    for (const auto& [key, value] : files) {
+        if (key.trimmed().toLower() == QLatin1String("count")) {
+            bool ok = false;
+            const int count = value.trimmed().toInt(&ok);
+            if (ok)
+                m_count = qMax(m_count, count);
+            continue;
+        }
+        noteAddedGame(key, value);
+    }
+    const auto names = GetAllSettings(AppTitle(), CatalogueKeys::FilesNamesSection);
+    for (const auto& [key, value] : names)
+        m_nameByKey.insert(key.toLower(), value);
+}
+
+QString AddedGamesSnapshot::userName(const QString& path) const
+{
+    const QString key = m_keyByPath.value(normalised(path));
+    if (key.isEmpty())
+        return QString();
+    const QString number = key.mid(CatalogueKeys::FileKeyPrefix.size());
+    return m_nameByKey.value((CatalogueKeys::FileNameKeyPrefix + number).toLower());
+}
+
+int AddedGamesSnapshot::highestNumber() const
+{
+    int highest = m_count;
+    for (const CatalogueStore::AddedGame& game : m_games)
+        highest = qMax(highest, game.number());
+    return highest;
+}
+
+void AddedGamesSnapshot::noteAddedGame(const QString& key, const QString& path)
+{
+    m_games.append({key, path});
+    const QString normalisedPath = normalised(path);
+    if (!m_keyByPath.contains(normalisedPath))
+        m_keyByPath.insert(normalisedPath, key);
+    const int number = m_games.constLast().number();
+    m_count = qMax(m_count, number);
+}
+
+} // namespace Brimvault

@@ -1,0 +1,37 @@
+#pragma once
+
+#include <QList>
+#include <QString>
+#include <QStringList>
+
+#include <optional>
+
+namespace Brimvault::FolderWalk {
+
+// Folder listings in the order the file system gives them, never sorted. Hidden entries are left out, as
+// the shell's plain listing leaves out hidden and system entries. Folders are written with their trailing
+// separator; the separator a folder already ends with is used for the folders below it.
+
+struct Listing {
+    QStringList files; // plain files
+    QStringList folders; // sub-folder names, without separator
+};
+
+// Empty when the folder cannot be read.
+Listing ListFolder(const QString& folder);
+
+// One folder found by the walk, with its files when the walk had to list it anyway.
+struct WalkedFolder {
+    QString path;
+    std::optional<QStringList> files;
+};
+
+// Every folder below `folder`, not the folder itself: its children, then the subtree of the first child
+// (its children first), then that of the second, and so on. A folder whose "DirInfo.bvxinf" says
+// "StopDir" = "Yes" is collected by its parent but nothing below it is.
+QList<WalkedFolder> CollectSubfolders(const QString& folder);
+
+// The files of a walked folder: the listing the walk kept, else a fresh one.
+QStringList FilesOf(const WalkedFolder& folder);
+
+} // namespace Brimvault::FolderWalk

@@ -1,0 +1,58 @@
+#include "catalogue/GameFileRules.h"
+
+#include "app/clsFileVersion.h"
+#include "catalogue/CatalogueLocations.h"
+#include "support/PathFunctions.h"
+
+namespace Brimvault::GameFileRules {
+
+namespace {
+
+bool containsInstallerWord(const QString& text)
+{
+    return text.contains(QLatin1String("setup"), Qt::CaseInsensitive)
+        || text.contains(QLatin1String("install"), Qt::CaseInsensitive);
+}
+
+} // namespace
+
+QString ExclusionText()
+{
+    return QStringLiteral("*Brimvault.exe*BrimvaultService.exe*uninst.exe*unins000.exe*UNWISE.EXE*spuninst.exe*");
+}
+
+bool IsExcludedName(const QString& name)
+{
+    static const QString exclusions = ExclusionText();
+    return exclusions.contains(name, Qt::CaseInsensitive);
+}
+
+bool LooksLikeInstaller(const QString& name)
+{
+    return containsInstallerWord(name);
+}
+
+bool HasExtension(const QString& name, QLatin1String extension)
+{
+    return name.size() > extension.size() && name.at(name.size() - extension.size() - 1) == u'.'
+        && name.endsWith(extension, Qt::CaseInsensitive);
+}
+
+bool IsDiscoverableExecutable(const QString& name)
+{
+    return HasExtension(name, QLatin1String("exe")) && !IsExcludedName(name) && !LooksLikeInstaller(name);
+}
+
+bool HasAcceptedExtension(const QString& name)
+{
+    const QString extension = GetFileExtention(name, false, false).toLower();
+    return QStringLiteral(":exe:swf:").contains(u':' + extension + u':', Qt::CaseInsensitive);
+}
+
+bool IsInstallerByVersion(const QString& path)
+{
+    clsFileVersion version;
+    return version.ReadVersion(FileSystemPath(path)) && containsInstallerWord(version.GetAll());
+}
+
+} // namespace Brimvault::GameFileRules

@@ -1,0 +1,111 @@
+#include "catalogue/ListBuilder.h"
+
+#include "app/clsFileVersion.h"
+#include "catalogue/CatalogueLocations.h"
+#include "catalogue/CatalogueServer.h"
+#include "catalogue/GameNames.h"
+#include "catalogue/IconCacheKey.h"
+#include "i18n/modLocalizer.h"
+#include "icons/NumberedError.h"
+#include "icons/cFileIcon.h"
+#include "store/InfoFiles.h"
+#include "support/PathFunctions.h"
+
+#include <QFileInfo>
+
+namespace Brimvault {
+
+namespace {
+
+QString knownPathOf(const QString& path)
+{
+    return path.trimmed().toLower();
+}
+
+// The picture of an icon file, null when the file is missing, unreadable or holds no usable image.
+QImage pictureOf(const QString& iconFile)
+{
+    if (iconFile.isEmpty())
+        return {};
+    try {
+        cFileIcon icon;
+        if (!icon.LoadIcon(FileSystemPath(iconFile)))
+            return {};
+        return icon.BestIconPicture();
+    } catch (const NumberedError&) {
+        return {};
+    }
+}
+
+} // namespace
+
+ListBuilder::ListBuilder(const QString& iconsFolder)
+    : m_iconsFolder(iconsFolder)
+{ }
+
+void ListBuilder::beginPass()
+{
+    m_addedGames.read();
+    m_languageTag = modLocalizer::ShortLanguageName();
+    m_knownPaths.clear();
+}
+
+GameEntry ListBuilder::OnlineGamesEntry() const
+{
+    GameEntry entry;
+    entry.caption = modLocalizer::Translate(1250, QStringLiteral("Online games"));
+    entry.path = OnlineCatalogueAddress();
+    entry.source = IconSource::Online;
+    return entry;
+}
+
+QString ListBuilder::RawDisplayName(const QString& path) const
+{
+    QString name = m_addedGames.userName(path);
+    if (name.isEmpty())
+        name = InfoFiles::GameInfoName(path, m_languageTag);
+    const QString fileTitle = GetFileName(path, false);
+    if (name.isEmpty())
+        name = GameNames::BuiltInName(fileTitle);
+    if (name.isEmpty()) {
+        clsFileVersion version;
+        if (version.ReadVersion(FileSystemPath(path)))
+            name = version.FileDescription().trimmed();
+    }
+    return name.isEmpty() ? fileTitle : name;
+}
+
+void ListBuilder::chooseIcon(GameEntry& entry) const
+{
+    const QString ownIcon = GetFileFolder(entry.path, true) + QStringLiteral(".ico");
+    const bool hasOwnIcon = QFileInfo(FileSystemPath(ownIcon)).isFile();
+    const QString candidate = hasOwnIcon ? ownIcon : IconCacheFile(m_iconsFolder, entry.path);
+    QImage picture = pictureOf(candidate);
+    if (!picture.isNull()) {
+        entry.source = hasOwnIcon ? IconSource::File : IconSource::Cache;
+        entry.iconFile = candidate;
+        if (m_keepPictures)
+            entry.picture = std::move(picture);
+    } else if (GetFileExtention(entry.path, false, false).toLower() == QLatin1String("swf")) {
+        entry.source = IconSource::Flash;
+    } else {
+        entry.source = IconSource::Queued;
+    }
+}
+
+GameEntry ListBuilder::AddGameToList(const QString& path)
+{
+    GameEntry entry;
+    entry.path = path;
+    entry.caption = GameNames::TidyName(RawDisplayName(path));
+    chooseIcon(entry);
+    m_knownPaths.insert(knownPathOf(path));
+    return entry;
+}
+
+bool ListBuilder::IsGameListed(const QString& path) const
+{
+    return m_knownPaths.contains(knownPathOf(path));
+}
+
+} // namespace Brimvault

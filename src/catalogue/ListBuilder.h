@@ -1,0 +1,45 @@
+#pragma once
+
+#include "catalogue/AddedGamesSnapshot.h"
+#include "catalogue/GameEntry.h"
+
+#include <QSet>
+#include <QString>
+
+namespace Brimvault {
+
+// Turns the path of one game into one list item: its caption and its picture, or the decision to queue it
+// for the icon cache builder. Keeps the known paths of the list for the duplicate tests.
+class ListBuilder {
+public:
+    explicit ListBuilder(const QString& iconsFolder);
+
+    // A new list: reads the added games, their user names and the language tag once, forgets the known paths.
+    void beginPass();
+
+    GameEntry OnlineGamesEntry() const;
+    // The item for the game; its lower-cased, trimmed path becomes a known path.
+    GameEntry AddGameToList(const QString& path);
+    bool IsGameListed(const QString& path) const;
+
+    // The name before tidying: the user's name, the info file, the built-in tables, the version
+    // description, the file title; first non-empty wins.
+    QString RawDisplayName(const QString& path) const;
+
+    // The command line lists without pictures: it needs only the decision, not the images.
+    void setKeepPictures(bool keep) { m_keepPictures = keep; }
+
+    AddedGamesSnapshot& addedGames() { return m_addedGames; }
+    const QString& iconsFolder() const { return m_iconsFolder; }
+
+private:
+    void chooseIcon(GameEntry& entry) const;
+
+    QString m_iconsFolder;
+    QString m_languageTag;
+    AddedGamesSnapshot m_addedGames;
+    QSet<QString> m_knownPaths;
+    bool m_keepPictures = true;
+};
+
+} // namespace Brimvault

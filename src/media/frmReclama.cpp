@@ -1,0 +1,376 @@
+#include "media/frmReclama.h"
+
+#include "app/CatalogueServer.h"
+#include "i18n/modLocalizer.h"
+#include "media/BrowserEmulation.h"
+#include "media/HostPages.h"
+#include "media/MediaHostFiles.h"
+#include "media/MediaKind.h"
+#include "store/CatalogueKeys.h"
+#include "support/SpecialFolders.h"
+#include "support/UserPrompt.h"
+
+#include <QAction>
+#include <QCoreApplication>
+#include <QDir>
+#include <QDesktopServices>
+#include <QImageReader>
+#include <QMouseEvent>
+#include <QPointer>
+#include <QPainter>
+#include <QStyle>
+#include <QToolButton>
+#include <QWebEngineHistory>
+#include <QWebEngineView>
+
+namespace Brimvault {
+
+namespace {
+
+constexpr int OnlineGamesCaptionNumber = 1250;
+constexpr int ReclamaCaptionNumber = 1210;
+constexpr int BackBarHeight = 30;
+
+void showMissingControl(const QString& text)
+{
+    ShowPrompt({text, modLocalizer::Translate(1020, QStringLiteral("Brimvault")), PromptIcon::Critical});
+}
+
+} // namespace
+
+frmReclama::frmReclama(QWidget* parent)
+    : QWidget(parent, Qt::Window)
+    , m_backColour(0xFF, 0xAF, 0xAF)
+{
+    setAttribute(Qt::WA_DeleteOnClose);
+    setObjectName(QStringLiteral("frmReclama"));
+    resize(HostClientSize());
+
+    m_goBack = new QToolButton(this);
+    m_goBack->setObjectName(QStringLiteral("pbGoBack"));
+    m_goBack->setIcon(style()->standardIcon(QStyle::SP_ArrowBack));
+    m_goBack->setAutoRaise(true);
+    m_goBack->setFocusPolicy(Qt::NoFocus);
+    m_goBack->hide();
+    m_goBack->setEnabled(false);
+    connect(m_goBack, &QToolButton::clicked, this, [this] {
+        if (m_ie)
+            m_ie->back();
+    });
+
+    ChangeLocalizeCaptions();
+}
+
+frmReclama::~frmReclama() = default;
+
+QString frmReclama::RightTo(const QString& text, const QString& separator, int start, bool fromEnd)
+{
+    return Brimvault::RightTo(text, separator, start, fromEnd);
+}
+
+bool frmReclama::SaveDword(RegistryRoot root, const QString& keyPath, const QString& valueName, quint32 value)
+{
+    return Brimvault::SaveDword(root, keyPath, valueName, value);
+}
+
+void frmReclama::SetReclamaCaption()
+{
+    m_captionNumber = ReclamaCaptionNumber;
+    ChangeLocalizeCaptions();
+}
+
+void frmReclama::SetOnlineGamesCaption()
+{
+    m_captionNumber = OnlineGamesCaptionNumber;
+    ChangeLocalizeCaptions();
+}
+
+void frmReclama::ChangeLocalizeCaptions()
+{
+    if (m_captionNumber != 0)
+        setWindowTitle(modLocalizer::Translate(m_captionNumber));
+    else
+        setWindowTitle(m_captionText);
+}
+
+void frmReclama::ReclamaShow(const QString& file, const QString& address)
+{
+    m_clickAddress = address;
+    resize(HostClientSize());
+    bool failed = false;
+    switch (MediaKindOf(file)) {
+    case MediaKind::WebPage:
+        failed = !LoadHTML(address.trimmed().isEmpty() ? file : address);
+        unsetCursor();
+        break;
+    case MediaKind::FlashMovie:
+        failed = !LoadFlashMovie(file);
+        unsetCursor();
+        break;
+    case MediaKind::StillPicture:
+        failed = !showStillPicture(file);
+        break;
+    }
+    finishShowing(failed, false);
+}
+
+void frmReclama::RunGame(const QString& path, const QString& clickAddress)
+{
+    if (!clickAddress.isNull())
+        m_clickAddress = clickAddress;
+    if (!clickAddress.trimmed().isEmpty()) {
+        m_captionNumber = 0;
+        m_captionText = clickAddress.trimmed();
+        ChangeLocalizeCaptions();
+    }
+
+    bool failed = false;
+    bool maximized = false;
+    switch (MediaKindOf(path)) {
+    case MediaKind::WebPage:
+        if (!LoadHTML(path)) {
+            openWithShell(path);
+            close();
+            return;
+        }
+        maximized = true;
+        unsetCursor();
+        break;
+    case MediaKind::FlashMovie:
+        resize(HostClientSize());
+        failed = !LoadFlashMovie(path);
+        unsetCursor();
+        break;
+    case MediaKind::StillPicture:
+        failed = !showStillPicture(path);
+        break;
+    }
+    finishShowing(failed, maximized);
+}
+
+void frmReclama::finishShowing(bool failed, bool maximized)
+{
+    if (failed) {
+        close();
+        return;
+    }
+    if (maximized)
+        showMaximized();
+    else
+        show();
+}
+
+bool frmReclama::LoadHTML(const QString& address)
+{
+    if (!m_ie) {
+        WriteBrowserEmulationValues();
+        if (!MediaHostFiles::WebEngineAvailable())
+            return false;
+        createBrowser();
+    }
+    const QUrl url = MediaHostFiles::ContentUrl(address);
+    if (!url.isValid() || address.trimmed().isEmpty())
+        return false;
+    m_ie->show();
+    m_mode = ModeWebPage;
+    layoutControls();
+    m_ie->load(url);
+    return true;
+}
+
+QWebEngineView* frmReclama::GetIE()
+{
+    if (!m_ie && !MediaHostFiles::WebEngineAvailable()) {
+        showMissingControl(QStringLiteral("Internet Explorer Control not installed properly."));
+        m_mode = ModeNothing;
+        return nullptr;
+    }
+    if (!m_ie)
+        createBrowser();
+    m_ie->show();
+    m_mode = ModeWebPage;
+    layoutControls();
+    return m_ie;
+}
+
+QWebEngineView* frmReclama::createBrowser()
+{
+    m_ie = new QWebEngineView(this);
+    m_ie->setObjectName(QStringLiteral("oIE"));
+    auto* page = new WebHostPage(m_ie);
+    m_ie->setPage(page);
+    connect(page, &QWebEnginePage::windowCloseRequested, this, &QWidget::close);
+    connect(page->action(QWebEnginePage::Back), &QAction::changed, this, &frmReclama::updateBackButton);
+    connect(page, &QWebEnginePage::geometryChangeRequested, this, [this](const QRect& geometry) {
+        if (geometry.isValid())
+            resize(geometry.size() + QSize(0, m_goBack->isVisible() ? BackBarHeight : 0));
+    });
+    layoutControls();
+    return m_ie;
+}
+
+bool frmReclama::LoadFlashMovie(const QString& file)
+{
+    if (!MediaHostFiles::WebEngineAvailable() || !MediaHostFiles::RuffleInstalled()) {
+        showMissingControl(QStringLiteral("Macromedia Shockwave Flash Control not installed properly."));
+        m_mode = ModeNothing;
+        return false;
+    }
+    if (!m_flash)
+        createFlashHost();
+    m_flash->show();
+    m_mode = ModeFlashMovie;
+    layoutControls();
+    m_flash->load(MediaHostFiles::RuffleHostUrl(MediaHostFiles::ContentUrl(file), CatalogueServerRoot()));
+    m_flash->setFocus();
+    return true;
+}
+
+QWebEngineView* frmReclama::createFlashHost()
+{
+    m_flash = new QWebEngineView(this);
+    m_flash->setObjectName(QStringLiteral("oFlash"));
+    m_flash->setPage(new FlashHostPage(m_flash));
+    connect(m_flash, &QWebEngineView::loadFinished, this, &frmReclama::onFlashHostLoaded);
+    return m_flash;
+}
+
+void frmReclama::onFlashHostLoaded(bool ok)
+{
+    if (!m_flash)
+        return;
+    const auto reportMissing = [window = QPointer<frmReclama>(this)] {
+        showMissingControl(QStringLiteral("Macromedia Shockwave Flash Control not installed properly."));
+        if (window)
+            window->close();
+    };
+    if (!ok) {
+        reportMissing();
+        return;
+    }
+    m_flash->page()->runJavaScript(QStringLiteral("window.brimvault ? window.brimvault.state : 'no-host'"),
+        [reportMissing](const QVariant& state) {
+            const QString text = state.toString();
+            if (text == u"no-ruffle" || text == u"no-host")
+                reportMissing();
+        });
+}
+
+void frmReclama::removeHostedControls()
+{
+    delete m_flash;
+    m_flash = nullptr;
+    delete m_ie;
+    m_ie = nullptr;
+    updateBackButton();
+}
+
+bool frmReclama::showStillPicture(const QString& file)
+{
+    QImageReader reader(file);
+    reader.setAutoTransform(true);
+    QImage picture = reader.read();
+    if (picture.isNull())
+        return false;
+    removeHostedControls();
+    m_picture = std::move(picture);
+    m_sampledColour = m_sampleColours ? surroundingColour() : m_backColour;
+    m_mode = ModeStillPicture;
+    setCursor(Qt::PointingHandCursor);
+    update();
+    return true;
+}
+
+QColor frmReclama::surroundingColour() const
+{
+    const int width = m_picture.width();
+    const int height = m_picture.height();
+    const int step = width / 100;
+    if (height <= 60 || step <= 0)
+        return m_backColour;
+    qint64 red = 0, green = 0, blue = 0, count = 0;
+    for (const int y : {30, height - 31}) {
+        for (int k = 0; k < 100; ++k) {
+            const int x = 30 + k * step;
+            if (x >= width)
+                break;
+            const QColor colour = m_picture.pixelColor(x, y);
+            red += colour.red();
+            green += colour.green();
+            blue += colour.blue();
+            ++count;
+        }
+    }
+    if (count == 0)
+        return m_backColour;
+    return QColor(int(red / count), int(green / count), int(blue / count));
+}
+
+void frmReclama::paintEvent(QPaintEvent*)
+{
+    QPainter painter(this);
+    if (m_mode != ModeStillPicture || m_picture.isNull()) {
+        painter.fillRect(rect(), m_backColour);
+        return;
+    }
+    // The space around the picture runs from the picture's own edge colour to its half shade.
+    const QColor edge = m_sampledColour;
+    const QColor shade(edge.red() / 2, edge.green() / 2, edge.blue() / 2);
+    QLinearGradient gradient(rect().topLeft(), rect().bottomLeft());
+    gradient.setColorAt(0.0, edge);
+    gradient.setColorAt(1.0, shade);
+    painter.fillRect(rect(), gradient);
+
+    const QSize painted = m_picture.size().boundedTo(size()) == m_picture.size()
+        ? m_picture.size()
+        : m_picture.size().scaled(size(), Qt::KeepAspectRatio);
+    const QRect target(QPoint((width() - painted.width()) / 2, (height() - painted.height()) / 2), painted);
+    painter.setRenderHint(QPainter::SmoothPixmapTransform);
+    painter.drawImage(target, m_picture);
+}
+
+void frmReclama::resizeEvent(QResizeEvent* event)
+{
+    QWidget::resizeEvent(event);
+    layoutControls();
+}
+
+void frmReclama::layoutControls()
+{
+    const int top = m_goBack->isVisible() ? BackBarHeight : 0;
+    if (m_goBack->isVisible())
+        m_goBack->setGeometry(2, 2, BackBarHeight - 4, BackBarHeight - 4);
+    const QRect area(0, top, width(), height() - top);
+    if (m_ie)
+        m_ie->setGeometry(area);
+    if (m_flash)
+        m_flash->setGeometry(area);
+}
+
+void frmReclama::updateBackButton()
+{
+    const bool canGoBack = m_ie && m_ie->page()->action(QWebEnginePage::Back)->isEnabled();
+    m_goBack->setEnabled(canGoBack);
+    m_goBack->setVisible(canGoBack);
+    layoutControls();
+}
+
+void frmReclama::mouseReleaseEvent(QMouseEvent* event)
+{
+    if (event->button() != Qt::LeftButton || m_mode != ModeStillPicture) {
+        QWidget::mouseReleaseEvent(event);
+        return;
+    }
+    if (!m_clickAddress.trimmed().isEmpty())
+        openWithShell(m_clickAddress.trimmed());
+    close();
+}
+
+void frmReclama::openWithShell(const QString& target)
+{
+    // A relative name is looked up in the data folder, where the shell would start the program.
+    const QString workingFolder = GetSpecialFolder(CSIDL_COMMON_APPDATA, QString(CatalogueKeys::GamesSubPath));
+    QDesktopServices::openUrl(QUrl::fromUserInput(target, workingFolder));
+}
+
+} // namespace Brimvault

@@ -1,0 +1,169 @@
+// Filling the list: discovery, the icons that follow on tmrIcons, and the games the user adds.
+#include "ui/main/frmMain.h"
+
+#include "catalogue/CatalogueLocations.h"
+#include "catalogue/GameAdder.h"
+#include "catalogue/GameDiscovery.h"
+#include "catalogue/GameEntry.h"
+#include "catalogue/IconCacheBuilder.h"
+#include "catalogue/ListBuilder.h"
+#include "support/PathFunctions.h"
+#include "support/SpecialFolders.h"
+#include "ui/listview/ImageCtrl.h"
+#include "ui/listview/ListElements.h"
+#include "ui/listview/SimpleListView.h"
+#include "ui/main/AddGameDialogs.h"
+#include "ui/main/QuilletCalls.h"
+
+#include <QCoreApplication>
+#include <QMimeData>
+#include <QScopeGuard>
+#include <QTimer>
+#include <QUrl>
+
+namespace Brimvault {
+
+void frmMain::RebuildList()
+{
+    if (m_rebuildRunning) {
+        m_rebuildAgain = true;
+        return;
+    }
+    enterBusy();
+    m_rebuildRunning = true;
+    const auto idle = qScopeGuard([this] {
+        m_rebuildRunning = false;
+        leaveBusy();
+    });
+
+    do {
+        m_rebuildAgain = false;
+        m_tmrIcons->stop();
+        m_iconBuilder->clear();
+
+        GameDiscovery discovery(*m_builder, CatalogueLocations::fromSystem());
+        DiscoveryHooks hooks;
+        hooks.stopRequested = [this] { return m_closing; };
+        hooks.clearList = [this] { m_listView->RemoveAll(); };
+        hooks.addItem = [this](const GameEntry& entry) {
+            addEntry(entry);
+            QCoreApplication::processEvents();
+        };
+        const DiscoveryResult result = discovery.Run(hooks);
+        if (result.stopped || m_closing)
+            break;
+        if (!m_rebuildAgain) {
+            m_listView->InitSelection();
+            startIconTimerIfNeeded();
+        }
+    } while (m_rebuildAgain && !m_closing);
+    Q_EMIT listRebuilt();
+}
+
+void frmMain::addEntry(const GameEntry& entry)
+{
+    switch (entry.source) {
+    case IconSource::File:
+    case IconSource::Cache:
+        if (!entry.picture.isNull()) {
+            m_listView->Add(QPixmap::fromImage(entry.picture), entry.caption, entry.path);
+            return;
+        }
+        break;
+    case IconSource::Flash:
+        m_listView->Add(m_imgSWF->Picture(), entry.caption, entry.path);
+        return;
+    case IconSource::Online:
+        m_listView->Add(m_imgOnLine->Picture(), entry.caption, entry.path);
+        return;
+    case IconSource::Queued:
+        break;
+    }
+    const qint16 index = m_listView->AddEx(entry.caption, entry.path);
+    if (index >= 0)
+        m_iconBuilder->enqueue(entry.path, quint64(index));
+}
+
+qsizetype frmMain::pendingIcons() const
+{
+    return m_iconBuilder->pending();
+}
+
+void frmMain::startIconTimerIfNeeded()
+{
+    if (m_iconBuilder->pending() > 0 && !m_closing)
+        m_tmrIcons->start();
+}
+
+void frmMain::tmrIconsTimer()
+{
+    m_tmrIcons->stop();
+    const std::optional<IconCacheBuilder::Done> done = m_iconBuilder->Tick(m_closing);
+    if (!done)
+        return;
+    const QPixmap picture = done->result.picture.isNull() ? m_imgNoIcon->Picture()
+                                                          : QPixmap::fromImage(done->result.picture);
+    // Removing an item moves the ones after it up by one, so the ticket only says where to look first.
+    int index = int(done->ticket);
+    if (m_listView->imgN(index).Data() != done->path) {
+        index = -1;
+        for (int i = 0; i < m_listView->loadedCount(); ++i) {
+            if (m_listView->imgN(i).Data() == done->path && m_listView->imgN(i).Picture().isNull()) {
+                index = i;
+                break;
+            }
+        }
+    }
+    if (index >= 0)
+        m_listView->imgN(index).SetPicture(picture);
+    startIconTimerIfNeeded();
+}
+
+void frmMain::mnuAddFileClick()
+{
+    if (m_lastAddFileFolder.isEmpty())
+        m_lastAddFileFolder = GetSpecialFolder(CSIDL_PERSONAL, QString());
+    const QString file = QuilletCalls::ShowOpenDialog(
+        this, AddGameDialogs::AddFileTitle(), AddGameDialogs::AddFileFilter(), 1, m_lastAddFileFolder);
+    if (file.isEmpty())
+        return;
+    m_lastAddFileFolder = GetFileFolder(file, false);
+    GameAdder adder(*m_builder);
+    if (const std::optional<GameEntry> entry = adder.AddGameFile(file)) {
+        addEntry(*entry);
+        m_listView->Refresh();
+    }
+    startIconTimerIfNeeded();
+}
+
+void frmMain::mnuAddFolderClick()
+{
+    const QString folder = QuilletCalls::BrowseForFolder(this, AddGameDialogs::AddFolderTitle());
+    if (folder.isEmpty())
+        return;
+    GameAdder adder(*m_builder);
+    adder.AddGamesFromFolder(folder, [this](const GameEntry& entry) { addEntry(entry); });
+    m_listView->Refresh();
+    startIconTimerIfNeeded();
+}
+
+void frmMain::listDragDrop(const QMimeData* data, qint32& effect)
+{
+    Q_UNUSED(effect);
+    if (!data || !data->hasUrls())
+        return;
+    QStringList files;
+    const QList<QUrl> urls = data->urls();
+    for (const QUrl& url : urls) {
+        if (url.isLocalFile())
+            files.append(url.toLocalFile());
+    }
+    // New icons wait for the icon timer's next run; a drop does not start it.
+    GameAdder adder(*m_builder);
+    adder.AddDroppedFiles(files, [this](const GameEntry& entry) {
+        addEntry(entry);
+        m_listView->Refresh();
+    });
+}
+
+} // namespace Brimvault

@@ -1,0 +1,34 @@
+// Holds an install slot the way an installing service does, until killed or its standard input closes:
+// the tests use it to leave behind what an interrupted install leaves.
+#include "StagingArea.h"
+
+#include <QDir>
+#include <QFile>
+
+#include <cstdio>
+
+int main(int argc, char* argv[])
+{
+    if (argc != 2)
+        return 2;
+    const QString gamesFolder = QString::fromLocal8Bit(argv[1]);
+    std::unique_ptr<Brimvault::InstallSlot> slot;
+    {
+        Brimvault::GamesFolderLock lock(gamesFolder);
+        if (!lock.isLocked())
+            return 1;
+        slot = Brimvault::InstallSlot::create(gamesFolder);
+    }
+    if (!slot)
+        return 1;
+    QDir(slot->path()).mkpath(QStringLiteral("Half/data"));
+    QFile part(slot->path() + QStringLiteral("/Half/data/part.bin"));
+    if (!part.open(QIODevice::WriteOnly) || part.write(QByteArray(4096, 'x')) != 4096)
+        return 1;
+    part.close();
+    std::printf("%s\n", QFile::encodeName(slot->path()).constData());
+    std::fflush(stdout);
+    while (std::getchar() != EOF) {
+    }
+    return 0;
+}
