@@ -45,8 +45,9 @@ QString microsoftGamesFolder(const CatalogueLocations& locations)
     const QString games = separator + QStringLiteral("Microsoft Games");
     QString without86 = programFiles;
     without86.remove(QStringLiteral(" (x86)"));
-    for (const QString& candidate :
-        {programFiles + games, programFiles + QStringLiteral(" (x86)") + games, without86 + games}) {
+    const QStringList candidates {
+        programFiles + games, programFiles + QStringLiteral(" (x86)") + games, without86 + games};
+    for (const QString& candidate : candidates) {
         if (isFolder(candidate))
             return candidate;
     }

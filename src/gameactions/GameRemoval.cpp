@@ -50,11 +50,6 @@ void forgetAddedEntries(const QString& upperPath)
 
 } // namespace
 
-QString KnownPathKey(const QString& data)
-{
-    return data.toUpper().trimmed().toLower();
-}
-
 RemovalOutcome AskAndRemoveGame(const QString& caption, const QString& data)
 {
     if (!askYesNo(modLocalizer::Translate(760, QStringLiteral("Remove ")) + caption.trimmed() + u'?'))

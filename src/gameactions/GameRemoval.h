@@ -20,7 +20,4 @@ RemovalOutcome AskAndRemoveGame(const QString& caption, const QString& data);
 // the list must be rebuilt; false after No, or when there was no section to delete.
 bool AskAndRemoveAllAddedGames();
 
-// The path of an item as the known-paths collection holds it: trimmed and lower-cased.
-QString KnownPathKey(const QString& data);
-
 } // namespace Brimvault

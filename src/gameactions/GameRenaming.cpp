@@ -39,8 +39,7 @@ std::optional<QString> AskAndRenameGame(const QString& caption, const QString& d
         return std::nullopt;
 
     const QString key = displayNameKeyOf(path).value_or(QString());
-    SaveSetting(
-        AppTitle(), CatalogueKeys::FilesNamesSection, key.isEmpty() ? recordAsAdded(path) : key, *answer);
+    SaveSetting(AppTitle(), CatalogueKeys::FilesNamesSection, key.isEmpty() ? recordAsAdded(path) : key, *answer);
     return *answer;
 }
 

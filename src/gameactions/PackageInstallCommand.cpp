@@ -20,8 +20,8 @@ QString InstallCommandLine(const QString& packagePath)
 
 bool InstallGamePackage(const QString& packagePath)
 {
-    const int result = modShelAndWaitl::ShellAndWait(
-        InstallCommandLine(packagePath), 0, 1, modShelAndWaitl::BreakGiveUp);
+    const int result
+        = modShelAndWaitl::ShellAndWait(InstallCommandLine(packagePath), 0, 1, modShelAndWaitl::BreakGiveUp);
     if (result == modShelAndWaitl::WaitEnded)
         return true;
     ShowPrompt({modLocalizer::Translate(1220, QStringLiteral("There was an error! The game isn't installed!")),

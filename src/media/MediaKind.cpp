@@ -6,7 +6,8 @@ MediaKind MediaKindOf(const QString& path)
 {
     static const QString webPageExtensions = QStringLiteral("*htm*html*shtml*mht*asp*php*aspx*");
     const QString extension = RightTo(path, QStringLiteral("."), 1, true).toLower();
-    if (webPageExtensions.contains(u'*' + extension + u'*') || path.toLower().contains(u".asp?"))
+    // A plain substring search, as the system always did: "ht" or "sp" count as web pages too.
+    if (webPageExtensions.contains(extension) || path.toLower().contains(u".asp?"))
         return MediaKind::WebPage;
     if (extension == u"swf")
         return MediaKind::FlashMovie;

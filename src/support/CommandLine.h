@@ -29,7 +29,6 @@ QString FindProgram(const QString& name);
 // The window style is the show-window value of Windows and has no effect elsewhere. The new process's id,
 // or nothing when it could not be started.
 std::optional<qint64> StartCommandLine(const QString& commandLine, int windowStyle);
-std::optional<qint64> StartCommandLine(
-    const QString& commandLine, int windowStyle, const QString& compatibilityRunner);
+std::optional<qint64> StartCommandLine(const QString& commandLine, int windowStyle, const QString& compatibilityRunner);
 
 } // namespace Brimvault

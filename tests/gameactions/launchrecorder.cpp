@@ -15,8 +15,7 @@ int main(int argc, char** argv)
         if (slash != std::string::npos)
             self = self.substr(slash + 1);
         char cwd[4096] = {};
-        std::string record = "program=" + std::string(argv[0]) + "\ncwd=" + (getcwd(cwd, sizeof cwd) ? cwd : "")
-            + "\n";
+        std::string record = "program=" + std::string(argv[0]) + "\ncwd=" + (getcwd(cwd, sizeof cwd) ? cwd : "") + "\n";
         for (int i = 1; i < argc; ++i)
             record += "arg=" + std::string(argv[i]) + "\n";
         record += "end\n";

@@ -152,15 +152,16 @@ void tst_GameLauncher::browserOrProcess_data()
     QTest::addColumn<QString>("item"); // "{root}" stands for the test's folder
     QTest::addColumn<QString>("openedUrl"); // empty: nothing goes to the browser
 
-    QTest::newRow("page.HTM") << QStringLiteral("{root}/pages/page.HTM") << QStringLiteral("file://{root}/pages/page.HTM");
+    QTest::newRow("page.HTM") << QStringLiteral("{root}/pages/page.HTM")
+                              << QStringLiteral("file://{root}/pages/page.HTM");
     QTest::newRow("x.aspx") << QStringLiteral("{root}/pages/x.aspx") << QStringLiteral("file://{root}/pages/x.aspx");
     QTest::newRow("mht") << QStringLiteral("{root}/pages/saved.mht") << QStringLiteral("file://{root}/pages/saved.mht");
     QTest::newRow("asp query") << QStringLiteral("http://127.0.0.1:9/Play.ASP?game=5&x=1")
                                << QStringLiteral("http://127.0.0.1:9/Play.ASP?game=5&x=1");
     QTest::newRow("catalogue page") << QStringLiteral("http://127.0.0.1:9/online-games-catalog.asp")
                                     << QStringLiteral("http://127.0.0.1:9/online-games-catalog.asp");
-    QTest::newRow("address without page") << QStringLiteral("https://127.0.0.1:9/games")
-                                          << QStringLiteral("https://127.0.0.1:9/games");
+    QTest::newRow("address without page")
+        << QStringLiteral("https://127.0.0.1:9/games") << QStringLiteral("https://127.0.0.1:9/games");
     QTest::newRow("x.ht is a process") << QStringLiteral("{root}/pages/x.ht") << QString();
     QTest::newRow("missing game") << QStringLiteral("{root}/nowhere/game") << QString();
 }
@@ -216,8 +217,8 @@ void tst_GameLauncher::numberedMovie_data()
 
     const QString numbered = QStringLiteral("20071231235959000001");
     QTest::newRow("online") << numbered + QStringLiteral(".swf") << false << true << true << numbered;
-    QTest::newRow("longer name, first 20") << numbered + QStringLiteral("77 Racer.swf") << false << true << true
-                                           << numbered;
+    QTest::newRow("longer name, first 20")
+        << numbered + QStringLiteral("77 Racer.swf") << false << true << true << numbered;
     QTest::newRow("middle not tested") << QStringLiteral("20xx-yy-zz game 0005.swf") << false << true << true
                                        << QStringLiteral("20xx-yy-zz game 0005");
     QTest::newRow("open game offline") << numbered + QStringLiteral(".swf") << true << true << false << QString();
@@ -225,8 +226,8 @@ void tst_GameLauncher::numberedMovie_data()
     QTest::newRow("shorter than 20") << QStringLiteral("20abc.swf") << false << true << false << QString();
     QTest::newRow("20th not a digit") << QStringLiteral("200712312359590000xA.swf") << false << true << false
                                       << QString();
-    QTest::newRow("not starting with 20") << QStringLiteral("19071231235959000001.swf") << false << true << false
-                                          << QString();
+    QTest::newRow("not starting with 20")
+        << QStringLiteral("19071231235959000001.swf") << false << true << false << QString();
 }
 
 void tst_GameLauncher::numberedMovie()
@@ -358,14 +359,14 @@ void tst_GameLauncher::windowsGameThroughRunner_data()
     QTest::addColumn<QString>("runnerFile"); // where the recorder stands in for the runner
     QTest::addColumn<QStringList>("runnerArguments"); // before the game's path
 
-    QTest::newRow("setting with arguments") << QStringLiteral("\"{root}/runners/my runner\" --quiet -x")
-                                            << QStringLiteral("runners/my runner")
-                                            << QStringList {QStringLiteral("--quiet"), QStringLiteral("-x")};
-    QTest::newRow("setting, name on PATH") << QStringLiteral("proton-run") << QStringLiteral("bin/proton-run")
-                                           << QStringList();
+    QTest::newRow("setting with arguments")
+        << QStringLiteral("\"{root}/runners/my runner\" --quiet -x") << QStringLiteral("runners/my runner")
+        << QStringList {QStringLiteral("--quiet"), QStringLiteral("-x")};
+    QTest::newRow("setting, name on PATH")
+        << QStringLiteral("proton-run") << QStringLiteral("bin/proton-run") << QStringList();
     QTest::newRow("default wine on PATH") << QString() << QStringLiteral("bin/wine") << QStringList();
-    QTest::newRow("blank setting is the default") << QStringLiteral("   ") << QStringLiteral("bin/wine")
-                                                  << QStringList();
+    QTest::newRow("blank setting is the default")
+        << QStringLiteral("   ") << QStringLiteral("bin/wine") << QStringList();
 }
 
 void tst_GameLauncher::windowsGameThroughRunner()
@@ -376,8 +377,8 @@ void tst_GameLauncher::windowsGameThroughRunner()
     QVERIFY(!installGame(runnerFile).isEmpty());
     if (!runnerSetting.isNull()) {
         runnerSetting.replace(QStringLiteral("{root}"), m_env->root());
-        QVERIFY(SaveSetting(AppTitle(), CatalogueKeys::SettingsSection, QStringLiteral("CompatibilityRunner"),
-            runnerSetting));
+        QVERIFY(SaveSetting(
+            AppTitle(), CatalogueKeys::SettingsSection, QStringLiteral("CompatibilityRunner"), runnerSetting));
     }
     const QString game = writeFile(QStringLiteral("Program Files/Card Games/sol.exe"), QByteArray("MZ\x90\x00", 4));
 

@@ -2,7 +2,7 @@
 
 #include <QByteArray>
 #include <QList>
-#include <QtEndian>
+#include <QVariant>
 
 // Writes small uncompressed Flash movies byte by byte: header, frame size, frame rate and count, then tags.
 class SwfBuilder {
@@ -15,7 +15,14 @@ public:
     {
     }
 
-    void setBackgroundColor(quint8 red, quint8 green, quint8 blue) { addTag(9, QByteArray {char(red), char(green), char(blue)}); }
+    void setBackgroundColor(quint8 red, quint8 green, quint8 blue)
+    {
+        QByteArray rgb;
+        rgb += char(red);
+        rgb += char(green);
+        rgb += char(blue);
+        addTag(9, rgb);
+    }
     void showFrame()
     {
         addTag(1, {});

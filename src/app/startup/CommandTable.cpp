@@ -2,6 +2,7 @@
 // own subsystem.
 #include "app/startup/CommandLine.h"
 
+#include "catalogue/CatalogueListing.h"
 #include "icons/IconCommands.h"
 #include "store/SettingsStore.h"
 
@@ -36,6 +37,17 @@ int versionInfo(const QStringList& arguments)
     return IconCommands::PrintVersionInfo(arguments.at(0), out, err);
 }
 
+int listCatalogue(const QStringList& arguments)
+{
+    if (!arguments.isEmpty() && arguments.first() != QLatin1String("--json")) {
+        QTextStream(stderr) << "Unknown argument for --list: " << arguments.first() << '\n' << Usage();
+        return UsageExitCode;
+    }
+    QTextStream out(stdout);
+    return CatalogueListing::PrintCatalogue(
+        arguments.isEmpty() ? CatalogueListing::Format::Text : CatalogueListing::Format::Json, out);
+}
+
 } // namespace
 
 QList<Command> Commands()
@@ -47,6 +59,8 @@ QList<Command> Commands()
             QStringLiteral("write the main icon of an executable as an icon file"), 2, 2, extractIcon},
         {QStringLiteral("--version-info"), QStringLiteral("FILE"),
             QStringLiteral("print the version information of an executable"), 1, 1, versionInfo},
+        {QStringLiteral("--list"), QStringLiteral("[--json]"),
+            QStringLiteral("print the games as the window lists them, without writing anything"), 0, 1, listCatalogue},
     };
 }
 

@@ -112,8 +112,8 @@ private:
     void addEntry(const GameEntry& entry);
     void tmrIconsTimer();
     void startIconTimerIfNeeded();
-    void listDragDrop(const QMimeData* data, qint32& effect);
-    void listEnterKey(QString& data);
+    void listDragDrop(const QMimeData* dropped, qint32& effect);
+    void listEnterKey(QString& itemData);
     void listMouseUp(qint16 button);
     void showItemMenu();
     QString currentCaption() const;

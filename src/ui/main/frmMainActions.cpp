@@ -13,6 +13,7 @@
 #include "ui/listview/SimpleListView.h"
 #include "ui/main/QuilletCalls.h"
 
+#include <QMimeData>
 #include <QScopeGuard>
 
 namespace Brimvault {
@@ -43,7 +44,7 @@ void frmMain::connectGameActions()
     connect(m_listView, &SimpleListView::MouseUp, this,
         [this](qint16 button, qint16, float, float) { listMouseUp(button); });
     connect(m_listView, &SimpleListView::OLEDragDrop, this,
-        [this](const QMimeData* data, qint32& effect, qint16, qint16, float, float) { listDragDrop(data, effect); },
+        [this](const QMimeData* dropped, qint32& effect, qint16, qint16, float, float) { listDragDrop(dropped, effect); },
         Qt::DirectConnection);
 }
 
@@ -52,9 +53,9 @@ QString frmMain::currentCaption() const
     return m_listView->GetCurrentCaption().trimmed();
 }
 
-void frmMain::listEnterKey(QString& data)
+void frmMain::listEnterKey(QString& itemData)
 {
-    m_launcher->launchItem(data, currentCaption());
+    m_launcher->launchItem(itemData, currentCaption());
 }
 
 void frmMain::listMouseUp(qint16 button)

@@ -147,13 +147,13 @@ void frmMain::mnuAddFolderClick()
     startIconTimerIfNeeded();
 }
 
-void frmMain::listDragDrop(const QMimeData* data, qint32& effect)
+void frmMain::listDragDrop(const QMimeData* dropped, qint32& effect)
 {
     Q_UNUSED(effect);
-    if (!data || !data->hasUrls())
+    if (!dropped || !dropped->hasUrls())
         return;
     QStringList files;
-    const QList<QUrl> urls = data->urls();
+    const QList<QUrl> urls = dropped->urls();
     for (const QUrl& url : urls) {
         if (url.isLocalFile())
             files.append(url.toLocalFile());
