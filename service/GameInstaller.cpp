@@ -37,8 +37,8 @@ QString withoutTrailingSeparator(QString folder)
 // The folder a reinstall replaces: the same name in any letter case, since on Windows that is one folder.
 QString existingGameFolder(const QString& gamesFolder, const QString& gameFolder)
 {
-    const QStringList names = QDir(gamesFolder).entryList(
-        QDir::AllEntries | QDir::Hidden | QDir::System | QDir::NoDotAndDotDot);
+    const QStringList names
+        = QDir(gamesFolder).entryList(QDir::AllEntries | QDir::Hidden | QDir::System | QDir::NoDotAndDotDot);
     for (const QString& name : names) {
         if (name.compare(gameFolder, Qt::CaseInsensitive) == 0)
             return name;
@@ -63,7 +63,7 @@ QString freeSpaceProblem(const QString& gamesFolder, const PackagePlan& plan)
 
 // Moves the unpacked game into place, retiring an older copy into the slot first so it can come back if
 // the move fails. Runs under the games folder lock.
-QString moveIntoPlace(const QString& gamesFolder, const InstallSlot& slot, const QString& gameFolder, bool& replaced)
+QString moveIntoPlace(const QString& gamesFolder, InstallSlot& slot, const QString& gameFolder, bool& replaced)
 {
     QDir games(gamesFolder);
     const QString existing = existingGameFolder(gamesFolder, gameFolder);
@@ -79,8 +79,13 @@ QString moveIntoPlace(const QString& gamesFolder, const InstallSlot& slot, const
         replaced = true;
     }
     if (!games.rename(slot.path() + u'/' + gameFolder, games.filePath(gameFolder))) {
-        if (replaced)
-            games.rename(retired, games.filePath(existing));
+        if (replaced && !games.rename(retired, games.filePath(existing))) {
+            // Never delete the only copy left of a game.
+            const QString kept = slot.preserve();
+            return QStringLiteral("The game could not be moved into the games folder, and its old copy could "
+                                  "not be moved back: it is kept in %1.")
+                .arg(quoted(QDir::toNativeSeparators(kept + u'/' + RetiredFolder)));
+        }
         replaced = false;
         return QStringLiteral("The game could not be moved into the games folder.");
     }
@@ -105,7 +110,11 @@ QString unpackAndMove(const QString& packagePath, const QString& gamesFolder, co
     PackageArchive archive;
     if (!archive.openFile(packagePath))
         return QStringLiteral("The package can no longer be read (%1).").arg(archive.errorText());
-    if (QString problem = ExtractPackage(archive, plan, slot->path(), progress); !problem.isEmpty())
+    const ProgressCallback noticeCancel = [&](qint64 done, qint64 total) {
+        result.cancelled = progress && !progress(done, total);
+        return !result.cancelled;
+    };
+    if (QString problem = ExtractPackage(archive, plan, slot->path(), noticeCancel); !problem.isEmpty())
         return problem;
 
     if (phase)
@@ -114,8 +123,7 @@ QString unpackAndMove(const QString& packagePath, const QString& gamesFolder, co
         GamesFolderLock lock(gamesFolder);
         if (!lock.isLocked())
             return QStringLiteral("Another installation is busy with the games folder. Try again later.");
-        if (QString problem = moveIntoPlace(gamesFolder, *slot, plan.gameFolder, result.replaced);
-            !problem.isEmpty())
+        if (QString problem = moveIntoPlace(gamesFolder, *slot, plan.gameFolder, result.replaced); !problem.isEmpty())
             return problem;
     }
     result.installedPath = QDir(gamesFolder).filePath(plan.gameFolder);

@@ -7,10 +7,11 @@
 namespace Brimvault {
 
 struct InstallResult {
-    QString problem;      // empty on success
+    QString problem; // empty on success
     QString installedPath; // the game's folder in the games folder
     bool replaced = false; // an older copy of the game was replaced
     bool signalled = false; // "Commands"/"NewGameInstalled" was set
+    bool cancelled = false; // the user stopped it; nothing else went wrong
 
     bool succeeded() const { return problem.isEmpty(); }
 };

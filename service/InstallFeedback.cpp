@@ -62,6 +62,17 @@ bool DisplayAvailable()
 #endif
 }
 
+void PreferOffscreenFallback()
+{
+#if !defined(Q_OS_WIN) && !defined(Q_OS_MACOS)
+    if (!qEnvironmentVariableIsEmpty("QT_QPA_PLATFORM"))
+        return;
+    qputenv("QT_QPA_PLATFORM",
+        qEnvironmentVariableIsEmpty("WAYLAND_DISPLAY") ? QByteArray("xcb;offscreen")
+                                                       : QByteArray("wayland;xcb;offscreen"));
+#endif
+}
+
 std::unique_ptr<InstallFeedback> MakeConsoleFeedback()
 {
     return std::make_unique<ConsoleFeedback>();

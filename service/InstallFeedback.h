@@ -25,6 +25,9 @@ protected:
 // Decided from the platform: the offscreen and minimal platforms, or no X11 or Wayland display, mean none.
 bool DisplayAvailable();
 
+// Without this a display that cannot be opened would end the process before it could say why.
+void PreferOffscreenFallback();
+
 std::unique_ptr<InstallFeedback> MakeConsoleFeedback();
 // Needs a QApplication.
 std::unique_ptr<InstallFeedback> MakeWindowFeedback();

@@ -28,8 +28,7 @@ public:
         , m_target(targetFolder)
         , m_progress(progress)
         , m_total(total)
-    {
-    }
+    { }
 
     QString entry(const PlannedEntry& planned)
     {

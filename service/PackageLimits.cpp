@@ -24,7 +24,8 @@ PackageLimits PackageLimits::fromSettings()
 {
     PackageLimits limits;
     constexpr qint64 megabyte = 1024 * 1024;
-    const qint64 megabytes = positiveSetting(PackageLimitKeys::MaxUnpackedMegabytes, limits.maxUnpackedBytes / megabyte);
+    const qint64 megabytes
+        = positiveSetting(PackageLimitKeys::MaxUnpackedMegabytes, limits.maxUnpackedBytes / megabyte);
     limits.maxUnpackedBytes = megabytes > std::numeric_limits<qint64>::max() / megabyte
         ? std::numeric_limits<qint64>::max()
         : megabytes * megabyte;

@@ -89,8 +89,7 @@ QString megabytes(qint64 bytes)
 PackageValidator::PackageValidator(const PackageLimits& limits, qint64 packageBytes)
     : m_limits(limits)
     , m_packageBytes(packageBytes)
-{
-}
+{ }
 
 bool PackageValidator::isGameFileName(const QString& name)
 {

@@ -35,8 +35,8 @@ struct EntryDeleter {
 QString collectEntries(const QString& root, QStringList& relativePaths)
 {
     const QDir rootDir(root);
-    QDirIterator it(root, QDir::AllEntries | QDir::Hidden | QDir::System | QDir::NoDotAndDotDot,
-        QDirIterator::Subdirectories);
+    QDirIterator it(
+        root, QDir::AllEntries | QDir::Hidden | QDir::System | QDir::NoDotAndDotDot, QDirIterator::Subdirectories);
     while (it.hasNext()) {
         const QFileInfo info(it.next());
         const QString relative = rootDir.relativeFilePath(info.filePath());

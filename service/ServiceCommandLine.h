@@ -10,7 +10,7 @@ struct ServiceCommand {
     enum class Kind { Install, Tidy, AfterLaunch, Pack, Usage };
 
     Kind kind = Kind::Usage;
-    QString package;    // Install, Pack
+    QString package; // Install, Pack
     QString gameFolder; // Pack
 };
 

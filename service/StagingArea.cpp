@@ -13,7 +13,8 @@ namespace Brimvault {
 
 namespace {
 
-constexpr int GamesLockTimeoutMs = 120 * 1000;
+// Tidying up runs hidden at the program's start: it waits briefly or leaves the work for next time.
+constexpr int TidyLockTimeoutMs = 2000;
 
 std::unique_ptr<QLockFile> newLock(const QString& path)
 {
@@ -57,10 +58,10 @@ QString StagingFolderPath(const QString& gamesFolder)
     return folder + u'/' + StagingNames::StagingFolder;
 }
 
-GamesFolderLock::GamesFolderLock(const QString& gamesFolder)
+GamesFolderLock::GamesFolderLock(const QString& gamesFolder, int timeoutMs)
     : m_lock(newLock(QDir(gamesFolder).filePath(StagingNames::GamesLockFile)))
 {
-    m_locked = m_lock->tryLock(GamesLockTimeoutMs);
+    m_locked = m_lock->tryLock(timeoutMs);
 }
 
 GamesFolderLock::~GamesFolderLock()
@@ -73,8 +74,7 @@ InstallSlot::InstallSlot(const QString& gamesFolder, const QString& path, std::u
     : m_gamesFolder(gamesFolder)
     , m_path(path)
     , m_lock(std::move(lock))
-{
-}
+{ }
 
 InstallSlot::~InstallSlot()
 {
@@ -120,14 +120,30 @@ void InstallSlot::discard()
         removeStagingFolderIfUnused(m_gamesFolder);
 }
 
+QString InstallSlot::preserve()
+{
+    if (!m_lock)
+        return m_path;
+    const QFileInfo slot(m_path);
+    const QString kept = slot.absolutePath() + u'/' + StagingNames::PreservedPrefix + slot.fileName();
+    if (QDir().rename(m_path, kept))
+        m_path = kept;
+    m_lock.reset();
+    return m_path;
+}
+
 int TidyStagingArea(const QString& gamesFolder)
 {
+    if (gamesFolder.isEmpty())
+        return 0;
     const QString staging = StagingFolderPath(gamesFolder);
     QDir dir(staging);
-    if (gamesFolder.isEmpty() || !dir.exists())
+    // Taking the lock also clears a lock file that a killed install left in the games folder.
+    const bool lockLeftBehind = QFileInfo::exists(QDir(gamesFolder).filePath(StagingNames::GamesLockFile));
+    if (!dir.exists() && !lockLeftBehind)
         return 0;
-    GamesFolderLock gamesLock(gamesFolder);
-    if (!gamesLock.isLocked())
+    GamesFolderLock gamesLock(gamesFolder, TidyLockTimeoutMs);
+    if (!gamesLock.isLocked() || !dir.exists())
         return 0;
     int removed = 0;
     const QStringList names = dir.entryList(
@@ -139,15 +155,15 @@ int TidyStagingArea(const QString& gamesFolder)
         if (!lock->tryLock(0))
             continue;
         const QFileInfo info(dir.filePath(name));
-        const bool gone = info.isDir() && !info.isSymLink() ? QDir(info.filePath()).removeRecursively()
-                                                             : dir.remove(name);
+        const bool gone
+            = info.isDir() && !info.isSymLink() ? QDir(info.filePath()).removeRecursively() : dir.remove(name);
         if (gone)
             ++removed;
         lock->unlock();
     }
     // Lock files whose slot is already gone.
-    for (const QString& name : dir.entryList({StagingNames::SlotPrefix + u'*' + StagingNames::LockSuffix},
-             QDir::Files | QDir::Hidden | QDir::System)) {
+    for (const QString& name : dir.entryList(
+             {StagingNames::SlotPrefix + u'*' + StagingNames::LockSuffix}, QDir::Files | QDir::Hidden | QDir::System)) {
         const QString slot = name.chopped(StagingNames::LockSuffix.size());
         if (QFileInfo::exists(dir.filePath(slot)))
             continue;

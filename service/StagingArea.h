@@ -15,6 +15,7 @@ inline constexpr QLatin1String StagingFolder(".bvxstaging");
 inline constexpr QLatin1String GamesLockFile(".bvxinstall.lock");
 inline constexpr QLatin1String SlotPrefix("install-");
 inline constexpr QLatin1String LockSuffix(".lock");
+inline constexpr QLatin1String PreservedPrefix("kept-");
 } // namespace StagingNames
 
 QString StagingFolderPath(const QString& gamesFolder);
@@ -22,7 +23,7 @@ QString StagingFolderPath(const QString& gamesFolder);
 // Serialises the steps that create, remove or move folders directly in the games folder.
 class GamesFolderLock {
 public:
-    explicit GamesFolderLock(const QString& gamesFolder);
+    explicit GamesFolderLock(const QString& gamesFolder, int timeoutMs = 120 * 1000);
     ~GamesFolderLock();
     GamesFolderLock(const GamesFolderLock&) = delete;
     GamesFolderLock& operator=(const GamesFolderLock&) = delete;
@@ -48,6 +49,8 @@ public:
     QString path() const { return m_path; }
     // Removes the slot, and the staging folder too once no other install uses it.
     void discard();
+    // Keeps the slot's contents for good under a name no tidy-up removes; returns where they are now.
+    QString preserve();
 
 private:
     InstallSlot(const QString& gamesFolder, const QString& path, std::unique_ptr<QLockFile> lock);

@@ -9,6 +9,7 @@
 
 #include <QApplication>
 #include <QCoreApplication>
+#include <QGuiApplication>
 
 #include <memory>
 
@@ -23,6 +24,10 @@ int install(const QString& package, InstallFeedback& feedback)
     const InstallResult result = InstallPackage(
         package, [&](qint64 done, qint64 total) { return feedback.progress(done, total); },
         [&](InstallPhase phase, const QString& gameFolder) { feedback.phase(phase, gameFolder); });
+    if (result.cancelled) {
+        PrintToStandardError(result.problem);
+        return Failed;
+    }
     if (!result.succeeded()) {
         feedback.failed(result.problem);
         return Failed;
@@ -47,10 +52,13 @@ int main(int argc, char* argv[])
     const ServiceCommand command = ParseServiceCommandLine(arguments);
 
     if (command.kind == ServiceCommand::Kind::Install && DisplayAvailable()) {
+        PreferOffscreenFallback();
         QApplication app(argc, argv);
         app.setApplicationName(AppTitle());
         app.setQuitOnLastWindowClosed(false);
-        const auto feedback = MakeWindowFeedback();
+        // A display that was announced but cannot be reached leaves us on the fallback platform.
+        const bool windows = QGuiApplication::platformName() != u"offscreen";
+        const auto feedback = windows ? MakeWindowFeedback() : MakeConsoleFeedback();
         return install(command.package, *feedback);
     }
 

@@ -22,19 +22,20 @@ namespace {
 
 QStringList peFiles()
 {
-    QStringList roots { QStringLiteral(BRIMVAULT_TEST_DATA_DIR "/pe"), QStringLiteral("/usr/lib/gcc/x86_64-w64-mingw32"),
+    QStringList roots {QStringLiteral(BRIMVAULT_TEST_DATA_DIR "/pe"), QStringLiteral("/usr/lib/gcc/x86_64-w64-mingw32"),
         QStringLiteral("/usr/lib/gcc/i686-w64-mingw32"), QStringLiteral("/usr/x86_64-w64-mingw32/lib"),
-        QStringLiteral("/usr/i686-w64-mingw32/lib"), QStringLiteral("/usr/lib/python3"), QStringLiteral("/usr/lib/wine"),
-        QStringLiteral("/usr/lib/x86_64-linux-gnu/wine"), QStringLiteral("/usr/lib/perf-core"),
-        QStringLiteral("/usr/lib/google-cloud-sdk/platform"), QDir::homePath() + QStringLiteral("/.pyenv/versions") };
+        QStringLiteral("/usr/i686-w64-mingw32/lib"), QStringLiteral("/usr/lib/python3"),
+        QStringLiteral("/usr/lib/wine"), QStringLiteral("/usr/lib/x86_64-linux-gnu/wine"),
+        QStringLiteral("/usr/lib/perf-core"), QStringLiteral("/usr/lib/google-cloud-sdk/platform"),
+        QDir::homePath() + QStringLiteral("/.pyenv/versions")};
     const QString extra = qEnvironmentVariable("BRIMVAULT_PE_CORPUS");
     if (!extra.isEmpty())
         roots = extra.split(u':', Qt::SkipEmptyParts) + roots;
     QStringList files;
     QSet<QByteArray> seen;
     for (const QString& root : roots) {
-        QDirIterator it(root, { QStringLiteral("*.exe"), QStringLiteral("*.dll") }, QDir::Files,
-            QDirIterator::Subdirectories);
+        QDirIterator it(
+            root, {QStringLiteral("*.exe"), QStringLiteral("*.dll")}, QDir::Files, QDirIterator::Subdirectories);
         while (it.hasNext()) {
             const QString path = it.next();
             QFile file(path);
@@ -123,8 +124,9 @@ int main(int argc, char** argv)
             QProcess process;
             process.setStandardOutputFile(QProcess::nullDevice());
             process.setStandardErrorFile(QProcess::nullDevice());
-            process.start(wrestool, { QStringLiteral("-x"), QStringLiteral("-t"), QStringLiteral("14"),
-                                        QStringLiteral("-o"), wrestoolOut, file });
+            process.start(wrestool,
+                {QStringLiteral("-x"), QStringLiteral("-t"), QStringLiteral("14"), QStringLiteral("-o"), wrestoolOut,
+                    file});
             process.waitForFinished(-1);
         }
     });
@@ -134,8 +136,8 @@ int main(int argc, char** argv)
         process.setStandardOutputFile(QProcess::nullDevice());
         process.setStandardErrorFile(QProcess::nullDevice());
         process.start(wrestool,
-            QStringList { QStringLiteral("-x"), QStringLiteral("-t"), QStringLiteral("14"), QStringLiteral("-o"),
-                wrestoolOut }
+            QStringList {
+                QStringLiteral("-x"), QStringLiteral("-t"), QStringLiteral("14"), QStringLiteral("-o"), wrestoolOut}
                 + files);
         process.waitForFinished(-1);
     });

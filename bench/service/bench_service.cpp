@@ -133,9 +133,8 @@ int main(int argc, char** argv)
         }
         QDir(games).removeRecursively();
         if (!unzip.isEmpty()) {
-            reference.push_back(
-                timedRun(unzip, {QStringLiteral("-q"), QStringLiteral("-o"), package, QStringLiteral("-d"), unzipTarget},
-                    ok));
+            reference.push_back(timedRun(
+                unzip, {QStringLiteral("-q"), QStringLiteral("-o"), package, QStringLiteral("-d"), unzipTarget}, ok));
             QDir(unzipTarget).removeRecursively();
             if (!ok)
                 reference.pop_back();

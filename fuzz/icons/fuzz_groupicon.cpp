@@ -23,12 +23,12 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size)
     try {
         cResources resources;
         resources.setFile(path);
-        for (int t = 1; t <= resources.GetResourceTypes(); ++t) {
+        const int types = resources.GetResourceTypes();
+        for (int t = 1; t <= types; ++t) {
             const int count = resources.GetResourceNames(t);
             for (int n = 1; n <= count; ++n)
                 (void)resources.ResourceName(t, n);
         }
-    } catch (const NumberedError&) {
-    }
+    } catch (const NumberedError&) { }
     return 0;
 }

@@ -20,8 +20,7 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size)
     try {
         icon.AddImage(16, 16, 16);
         icon.RemoveImage(1);
-    } catch (const NumberedError&) {
-    }
+    } catch (const NumberedError&) { }
     cFileIcon copy;
     icon.CloneTo(copy);
     if (copy.toIconFile() != icon.toIconFile())

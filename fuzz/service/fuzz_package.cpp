@@ -27,8 +27,8 @@ void check(bool promise)
 // Nothing may land outside the scratch folder's game folder, and nothing but plain files and folders.
 void checkUnpacked(const QString& scratch, const PackagePlan& plan)
 {
-    QDirIterator it(scratch, QDir::AllEntries | QDir::Hidden | QDir::System | QDir::NoDotAndDotDot,
-        QDirIterator::Subdirectories);
+    QDirIterator it(
+        scratch, QDir::AllEntries | QDir::Hidden | QDir::System | QDir::NoDotAndDotDot, QDirIterator::Subdirectories);
     while (it.hasNext()) {
         const QFileInfo info(it.next());
         const QString relative = QDir(scratch).relativeFilePath(info.filePath());

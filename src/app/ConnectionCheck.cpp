@@ -16,8 +16,7 @@ namespace Brimvault {
 
 HttpRequest::HttpRequest()
     : m_manager(std::make_unique<QNetworkAccessManager>())
-{
-}
+{ }
 
 HttpRequest::~HttpRequest() = default;
 

@@ -21,8 +21,8 @@ bool clsFileVersion::ReadVersion(const QString& sFullFileName)
 
 QString clsFileVersion::GetAll() const
 {
-    const QStringList ordered { ProductName(), ProductVersion(), InternalName(), FileDescription(), FileVersion(),
-        CompanyName(), LegalCopyright(), OriginalFileName() };
+    const QStringList ordered {ProductName(), ProductVersion(), InternalName(), FileDescription(), FileVersion(),
+        CompanyName(), LegalCopyright(), OriginalFileName()};
     return ordered.join(QStringLiteral("; "));
 }
 

@@ -13,8 +13,7 @@ public:
     ByteReader() = default;
     explicit ByteReader(QByteArrayView bytes)
         : m_bytes(bytes)
-    {
-    }
+    { }
 
     qint64 size() const { return m_bytes.size(); }
     bool contains(qint64 offset, qint64 length) const;

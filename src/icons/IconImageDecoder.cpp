@@ -126,8 +126,8 @@ QRgb pixelAt(const ByteReader& reader, const BitmapLayout& layout, qint64 row, i
         return qRgb(((v >> 10) & 0x1F) * 255 / 31, ((v >> 5) & 0x1F) * 255 / 31, (v & 0x1F) * 255 / 31);
     }
     case 24:
-        return qRgb(*reader.u8(row + 3 * qint64(x) + 2), *reader.u8(row + 3 * qint64(x) + 1),
-            *reader.u8(row + 3 * qint64(x)));
+        return qRgb(
+            *reader.u8(row + 3 * qint64(x) + 2), *reader.u8(row + 3 * qint64(x) + 1), *reader.u8(row + 3 * qint64(x)));
     default:
         return qRgba(*reader.u8(row + 4 * qint64(x) + 2), *reader.u8(row + 4 * qint64(x) + 1),
             *reader.u8(row + 4 * qint64(x)), *reader.u8(row + 4 * qint64(x) + 3));
@@ -136,7 +136,7 @@ QRgb pixelAt(const ByteReader& reader, const BitmapLayout& layout, qint64 row, i
 
 Bitmaps decodeBitmap(const QByteArray& image)
 {
-    const ByteReader reader { QByteArrayView(image) };
+    const ByteReader reader {QByteArrayView(image)};
     const auto layout = layoutOf(reader);
     if (!layout)
         return {};

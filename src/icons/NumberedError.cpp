@@ -9,8 +9,7 @@ NumberedError::NumberedError(quint32 number, QString message, QString source)
     , m_message(std::move(message))
     , m_source(std::move(source))
     , m_what(m_message.toUtf8())
-{
-}
+{ }
 
 const char* NumberedError::what() const noexcept
 {

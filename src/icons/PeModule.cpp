@@ -18,8 +18,7 @@ bool ResourceKey::matches(const ResourceKey& other) const
 
 PeModule::PeModule(std::unique_ptr<PeSource> source)
     : m_source(std::move(source))
-{
-}
+{ }
 
 PeModule::~PeModule() = default;
 
@@ -28,7 +27,7 @@ PeModule::OpenResult PeModule::open(const QString& path)
     int platformError = 0;
     std::unique_ptr<PeSource> source = PeSource::fromFile(path, &platformError);
     if (!source)
-        return { nullptr, PeError(platformError) };
+        return {nullptr, PeError(platformError)};
     return parsed(std::move(source));
 }
 
@@ -42,8 +41,8 @@ PeModule::OpenResult PeModule::parsed(std::unique_ptr<PeSource> source)
     std::unique_ptr<PeModule> module(new PeModule(std::move(source)));
     const PeError error = module->parse();
     if (error != PeError::None)
-        return { nullptr, error };
-    return { std::move(module), PeError::None };
+        return {nullptr, error};
+    return {std::move(module), PeError::None};
 }
 
 PeError PeModule::parse()
@@ -75,8 +74,8 @@ PeError PeModule::parse()
         if (!header)
             return PeError::BadFormat;
         const ByteReader section(*header);
-        m_sections.append({ *section.u32(SectionVirtualAddress), *section.u32(SectionVirtualSize),
-            *section.u32(SectionRawSize), *section.u32(SectionRawPointer) });
+        m_sections.append({*section.u32(SectionVirtualAddress), *section.u32(SectionVirtualSize),
+            *section.u32(SectionRawSize), *section.u32(SectionRawPointer)});
     }
 
     const auto dirCount = m_source->u32(optional + dirCountAt);
@@ -117,8 +116,8 @@ QString PeModule::resourceName(quint32 nameOffset) const
     if (cached != m_names.cend())
         return *cached;
     QString name;
-    const auto at = quint64(m_resourceRva) + nameOffset > 0xFFFFFFFFu ? std::nullopt
-                                                                       : rvaToOffset(m_resourceRva + nameOffset);
+    const auto at
+        = quint64(m_resourceRva) + nameOffset > 0xFFFFFFFFu ? std::nullopt : rvaToOffset(m_resourceRva + nameOffset);
     if (at) {
         const quint16 length = qMin<quint16>(m_source->u16(*at).value_or(0), MaxResourceNameLength);
         const QByteArrayView chars = m_source->bytesUpTo(*at + 2, qint64(length) * 2);
@@ -134,8 +133,8 @@ const PeModule::Directory& PeModule::directory(quint32 dirOffset) const
     if (cached != m_directories.cend())
         return *cached;
     Directory dir;
-    const auto at = quint64(m_resourceRva) + dirOffset > 0xFFFFFFFFu ? std::nullopt
-                                                                      : rvaToOffset(m_resourceRva + dirOffset);
+    const auto at
+        = quint64(m_resourceRva) + dirOffset > 0xFFFFFFFFu ? std::nullopt : rvaToOffset(m_resourceRva + dirOffset);
     const auto header = at ? m_source->bytes(*at, ResDirHeaderSize) : std::nullopt;
     if (header) {
         const ByteReader headerReader(*header);
@@ -150,7 +149,7 @@ const PeModule::Directory& PeModule::directory(quint32 dirOffset) const
         for (qint64 i = 0; i < table.size() / ResDirEntrySize; ++i) {
             const quint32 name = *table.u32(i * ResDirEntrySize);
             const quint32 target = *table.u32(i * ResDirEntrySize + 4);
-            DirEntry entry { {}, (target & ResHighBit) != 0, target & ~ResHighBit };
+            DirEntry entry {{}, (target & ResHighBit) != 0, target & ~ResHighBit};
             if (name & ResHighBit) {
                 entry.key = ResourceKey::fromName(resourceName(name & ~ResHighBit));
                 dir.entries.append(entry);
@@ -261,7 +260,7 @@ QList<ResourceLeaf> PeModule::allResources(int maxLeaves) const
     if (!hasResources())
         return leaves;
     // Directories shared between branches, or pointing back up, are walked once.
-    QSet<quint32> visited { 0 };
+    QSet<quint32> visited {0};
     for (const DirEntry& type : directoryEntries(0)) {
         if (!type.isDirectory || visited.contains(type.target))
             continue;

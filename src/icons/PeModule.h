@@ -17,8 +17,8 @@ struct ResourceKey {
     quint16 id = 0;
     QString name;
 
-    static ResourceKey fromId(quint16 value) { return { false, value, {} }; }
-    static ResourceKey fromName(const QString& text) { return { true, 0, text }; }
+    static ResourceKey fromId(quint16 value) { return {false, value, {}}; }
+    static ResourceKey fromName(const QString& text) { return {true, 0, text}; }
     bool matches(const ResourceKey& other) const;
 };
 

@@ -34,7 +34,7 @@ std::unique_ptr<PeSource> PeSource::fromBytes(QByteArray bytes)
 {
     std::unique_ptr<PeSource> source(new PeSource);
     source->m_size = bytes.size();
-    source->m_windows.append({ 0, std::move(bytes) });
+    source->m_windows.append({0, std::move(bytes)});
     return source;
 }
 
@@ -66,7 +66,7 @@ std::optional<QByteArrayView> PeSource::bytes(qint64 offset, qint64 length) cons
     if (chunk.size() != end - start)
         return std::nullopt;
     m_loaded += chunk.size();
-    m_windows.append({ start, std::move(chunk) });
+    m_windows.append({start, std::move(chunk)});
     return QByteArrayView(m_windows.last().bytes).sliced(offset - start, length);
 }
 

@@ -22,8 +22,7 @@ qint64 align4(qint64 offset)
 
 VersionResource::VersionResource(QByteArray block)
     : m_block(std::move(block))
-{
-}
+{ }
 
 std::optional<VersionResource> VersionResource::fromFile(const QString& path)
 {
@@ -44,7 +43,7 @@ std::optional<VersionResource> VersionResource::fromFile(const QString& path)
 
 std::optional<VersionResource::Node> VersionResource::nodeAt(qint64 at, qint64 limit) const
 {
-    const ByteReader reader { QByteArrayView(m_block) };
+    const ByteReader reader {QByteArrayView(m_block)};
     const auto length = reader.u16(at);
     if (!length || *length < VersionNodeHeader || at + *length > limit)
         return std::nullopt;
@@ -106,7 +105,7 @@ std::optional<QString> VersionResource::queryString(const QString& path) const
     if (!node)
         return std::nullopt;
     // Compilers disagree on whether a text's length counts characters or bytes: read up to the NUL instead.
-    const ByteReader reader { QByteArrayView(m_block) };
+    const ByteReader reader {QByteArrayView(m_block)};
     qint64 end = node->valueStart;
     while (end + 1 < node->end && reader.u16(end).value_or(0) != 0)
         end += 2;

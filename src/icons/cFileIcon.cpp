@@ -93,7 +93,7 @@ bool cFileIcon::LoadIcon(const QString& sFileName)
         return false;
     }
     const QByteArray header = file.read(IconHeaderSize);
-    const ByteReader headerReader { QByteArrayView(header) };
+    const ByteReader headerReader {QByteArrayView(header)};
     m_idReserved = headerReader.u16(0).value_or(0);
     m_idType = headerReader.u16(2).value_or(0);
     m_idCount = qint16(headerReader.u16(4).value_or(0));
@@ -207,8 +207,8 @@ void cFileIcon::CloneTo(cFileIcon& target) const
 void cFileIcon::checkIndex(int nIndex) const
 {
     if (nIndex < 1 || nIndex > m_entries.size())
-        throw NumberedError(SubscriptOutOfRange, QStringLiteral("Subscript out of range"),
-            ErrorSource(QStringLiteral("cFileIcon")));
+        throw NumberedError(
+            SubscriptOutOfRange, QStringLiteral("Subscript out of range"), ErrorSource(QStringLiteral("cFileIcon")));
 }
 
 const IconDirEntry& cFileIcon::entry(int nIndex) const

@@ -137,7 +137,7 @@ bool cFileIcon::LoadMainIconFromEXE(const QString& sFileName)
     for (const QVariant& name : groups) {
         reset(sFileName);
         const bool loaded = name.typeId() == QMetaType::Int ? loadGroup(*module, name.toInt(), QString())
-                                                             : loadGroup(*module, 0, name.toString());
+                                                            : loadGroup(*module, 0, name.toString());
         if (loaded)
             return true;
     }

@@ -35,9 +35,8 @@ QPainter::CompositionMode compositionFor(quint32 rop)
 int cFileIcon::displayDepth()
 {
     if (m_displayDepth == 0) {
-        const QScreen* screen = qobject_cast<QGuiApplication*>(QCoreApplication::instance())
-            ? QGuiApplication::primaryScreen()
-            : nullptr;
+        const QScreen* screen
+            = qobject_cast<QGuiApplication*>(QCoreApplication::instance()) ? QGuiApplication::primaryScreen() : nullptr;
         m_displayDepth = screen && screen->depth() > 0 ? screen->depth() : 32;
     }
     return m_displayDepth;
@@ -86,8 +85,8 @@ QImage cFileIcon::IconPicture(int nIndex) const
     return IconHandle(nIndex);
 }
 
-void cFileIcon::DrawIconImage(QPainter& painter, int nIndex, bool bMask, int x, int y, int lWidth, int lHeight,
-    quint32 lRop) const
+void cFileIcon::DrawIconImage(
+    QPainter& painter, int nIndex, bool bMask, int x, int y, int lWidth, int lHeight, quint32 lRop) const
 {
     if (nIndex < 1 || nIndex > m_images.size())
         return;

@@ -18,8 +18,8 @@ constexpr quint32 NamesFailed = ObjectErrorBase + 0x41A;
 
 [[noreturn]] void subscriptOutOfRange()
 {
-    throw NumberedError(SubscriptOutOfRange, QStringLiteral("Subscript out of range"),
-        ErrorSource(QStringLiteral("cResources")));
+    throw NumberedError(
+        SubscriptOutOfRange, QStringLiteral("Subscript out of range"), ErrorSource(QStringLiteral("cResources")));
 }
 
 } // namespace
@@ -49,7 +49,7 @@ int cResources::GetResourceTypes()
     if (error != PeError::None)
         raise(LoadFailed, error, "cResource");
     for (const ResourceKey& key : keys)
-        m_types.append(key.named ? TypeRecord { 0, key.name } : TypeRecord { key.id, {} });
+        m_types.append(key.named ? TypeRecord {0, key.name} : TypeRecord {key.id, {}});
     return int(m_types.size());
 }
 
@@ -151,7 +151,8 @@ int cResources::GetResourceNames(int nTypeIndex)
     list.typeIndex = nTypeIndex;
     list.names.clear();
 
-    const ResourceKey key = type.name.isEmpty() ? ResourceKey::fromId(quint16(type.id)) : ResourceKey::fromName(type.name);
+    const ResourceKey key
+        = type.name.isEmpty() ? ResourceKey::fromId(quint16(type.id)) : ResourceKey::fromName(type.name);
     QList<ResourceKey> names;
     const PeError error = mResource::EnumNames(m_module.get(), key, names);
     if (error != PeError::None)

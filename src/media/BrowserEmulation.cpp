@@ -50,7 +50,8 @@ bool SaveDword(RegistryRoot root, const QString& keyPath, const QString& valueNa
         bytes = existing.readAll();
     }
     IniDocument document = IniDocument::parse(bytes);
-    document.setValue(rootName(root) + u'\\' + keyPath, valueName, QStringLiteral("dword:%1").arg(value, 8, 16, QChar(u'0')));
+    document.setValue(
+        rootName(root) + u'\\' + keyPath, valueName, QStringLiteral("dword:%1").arg(value, 8, 16, QChar(u'0')));
 
     if (!QDir().mkpath(QFileInfo(path).absolutePath()))
         return false;

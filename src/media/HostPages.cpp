@@ -19,8 +19,7 @@ class ExternalLinkPage : public QWebEnginePage {
 public:
     explicit ExternalLinkPage(QObject* parent)
         : QWebEnginePage(MediaProfile(), parent)
-    {
-    }
+    { }
 
 protected:
     bool acceptNavigationRequest(const QUrl& url, NavigationType, bool) override
@@ -38,8 +37,21 @@ QWebEngineProfile* MediaProfile()
 {
     // Deliberately never deleted: pages of windows still open at exit must not outlive their profile.
     static QWebEngineProfile* profile = [] {
-        auto* created = new QWebEngineProfile(QStringLiteral("Brimvault"));
         const QString storage = QDir(SettingsDirectory()).filePath(QStringLiteral("web"));
+#ifdef Q_OS_UNIX
+        // A new profile writes its preferences below the data location before its storage path can be
+        // set; keep even that inside our own folder.
+        const QByteArray dataHome = qgetenv("XDG_DATA_HOME");
+        const bool hadDataHome = qEnvironmentVariableIsSet("XDG_DATA_HOME");
+        qputenv("XDG_DATA_HOME", QDir(storage).filePath(QStringLiteral("profile")).toLocal8Bit());
+#endif
+        auto* created = new QWebEngineProfile(QStringLiteral("Brimvault"));
+#ifdef Q_OS_UNIX
+        if (hadDataHome)
+            qputenv("XDG_DATA_HOME", dataHome);
+        else
+            qunsetenv("XDG_DATA_HOME");
+#endif
         created->setPersistentStoragePath(storage);
         created->setCachePath(QDir(storage).filePath(QStringLiteral("cache")));
         return created;

@@ -12,12 +12,14 @@
 
 #include <QAction>
 #include <QCoreApplication>
-#include <QDir>
 #include <QDesktopServices>
+#include <QDir>
 #include <QImageReader>
+#include <QKeyEvent>
 #include <QMouseEvent>
-#include <QPointer>
+#include <QMovie>
 #include <QPainter>
+#include <QPointer>
 #include <QStyle>
 #include <QToolButton>
 #include <QWebEngineHistory>
@@ -263,6 +265,8 @@ void frmReclama::removeHostedControls()
     delete m_ie;
     m_ie = nullptr;
     updateBackButton();
+    delete m_animation;
+    m_animation = nullptr;
 }
 
 bool frmReclama::showStillPicture(const QString& file)
@@ -277,8 +281,31 @@ bool frmReclama::showStillPicture(const QString& file)
     m_sampledColour = m_sampleColours ? surroundingColour() : m_backColour;
     m_mode = ModeStillPicture;
     setCursor(Qt::PointingHandCursor);
+
+    delete m_animation;
+    m_animation = nullptr;
+    if (reader.supportsAnimation() && reader.imageCount() != 1) {
+        // Animated advertisements play; the surrounding colour stays the one of the first frame.
+        m_animation = new QMovie(file, QByteArray(), this);
+        connect(m_animation, &QMovie::frameChanged, this, [this] {
+            const QImage frame = m_animation->currentImage();
+            if (!frame.isNull())
+                m_picture = frame;
+            update();
+        });
+        m_animation->start();
+    }
     update();
     return true;
+}
+
+void frmReclama::keyPressEvent(QKeyEvent* event)
+{
+    if (event->key() == Qt::Key_Escape && m_mode == ModeStillPicture) {
+        close();
+        return;
+    }
+    QWidget::keyPressEvent(event);
 }
 
 QColor frmReclama::surroundingColour() const

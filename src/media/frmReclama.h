@@ -5,6 +5,7 @@
 #include <QString>
 #include <QWidget>
 
+class QMovie;
 class QToolButton;
 class QWebEngineView;
 
@@ -51,6 +52,7 @@ protected:
     void paintEvent(QPaintEvent* event) override;
     void resizeEvent(QResizeEvent* event) override;
     void mouseReleaseEvent(QMouseEvent* event) override;
+    void keyPressEvent(QKeyEvent* event) override;
 
 private:
     QWebEngineView* createBrowser();
@@ -76,6 +78,8 @@ private:
     QWebEngineView* m_ie = nullptr;
     QWebEngineView* m_flash = nullptr;
     QToolButton* m_goBack = nullptr;
+    // Animated GIF advertisements; m_picture then holds the current frame.
+    QMovie* m_animation = nullptr;
 };
 
 } // namespace Brimvault

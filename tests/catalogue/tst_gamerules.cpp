@@ -46,12 +46,12 @@ void TestGameRules::tidyName_data()
                                        << QStringLiteral("ABCDEFGHIJKL MNOPQRSTUVWX YZabcd...");
     QTest::newRow("exactly 12 unbroken") << QStringLiteral("ABCDEFGHIJKL") << QStringLiteral("ABCDEFGHIJKL");
     QTest::newRow("13 broken after 12") << QStringLiteral("ABCDEFGHIJKLM") << QStringLiteral("ABCDEFGHIJKL M");
-    QTest::newRow("25 after break stays") << QStringLiteral("ABCDEFGHIJKLMNOPQRSTUVWX")
+    QTest::newRow("24 letters, 25 after break, stays") << QStringLiteral("ABCDEFGHIJKLMNOPQRSTUVWX")
                                           << QStringLiteral("ABCDEFGHIJKL MNOPQRSTUVWX");
-    QTest::newRow("26 after break gets second")
-        << QStringLiteral("ABCDEFGHIJKLMNOPQRSTUVWXY") << QStringLiteral("ABCDEFGHIJKL MNOPQRSTUVWXY");
-    QTest::newRow("27 after break gets second")
-        << QStringLiteral("ABCDEFGHIJKLMNOPQRSTUVWXYZ") << QStringLiteral("ABCDEFGHIJKL MNOPQRSTUVWXY Z");
+    QTest::newRow("25 letters get a second blank after the 25th character")
+        << QStringLiteral("ABCDEFGHIJKLMNOPQRSTUVWXY") << QStringLiteral("ABCDEFGHIJKL MNOPQRSTUVWX Y");
+    QTest::newRow("26 letters get a second blank after the 25th character")
+        << QStringLiteral("ABCDEFGHIJKLMNOPQRSTUVWXYZ") << QStringLiteral("ABCDEFGHIJKL MNOPQRSTUVWX YZ");
     QTest::newRow("27 with blanks unbroken")
         << QStringLiteral("Solitaire Collection Deluxe") << QStringLiteral("Solitaire Collection Deluxe");
     QTest::newRow("exactly 30 kept") << QStringLiteral("Thirty characters long name ok")

@@ -52,7 +52,7 @@ std::optional<QByteArray> wrestoolGroup(const QString& exe, const QString& group
         return std::nullopt;
     QProcess process;
     process.start(QStringLiteral("wrestool"),
-        { QStringLiteral("-x"), QStringLiteral("-t14"), QStringLiteral("--name=") + groupName, exe });
+        {QStringLiteral("-x"), QStringLiteral("-t14"), QStringLiteral("--name=") + groupName, exe});
     if (!process.waitForFinished(30000) || process.exitCode() != 0)
         return std::nullopt;
     const QByteArray out = process.readAllStandardOutput();
@@ -72,7 +72,7 @@ bool havePefile()
         if (systemPython().isEmpty())
             return false;
         QProcess process;
-        process.start(systemPython(), { QStringLiteral("-c"), QStringLiteral("import pefile") });
+        process.start(systemPython(), {QStringLiteral("-c"), QStringLiteral("import pefile")});
         return process.waitForFinished(30000) && process.exitCode() == 0;
     }();
     return available;
@@ -83,7 +83,7 @@ std::optional<QJsonObject> pefileReading(const QString& exe)
     if (!havePefile())
         return std::nullopt;
     QProcess process;
-    process.start(systemPython(), { QStringLiteral(BRIMVAULT_SOURCE_DIR "/tests/icons/pe_reference.py"), exe });
+    process.start(systemPython(), {QStringLiteral(BRIMVAULT_SOURCE_DIR "/tests/icons/pe_reference.py"), exe});
     if (!process.waitForFinished(60000) || process.exitCode() != 0)
         return std::nullopt;
     return QJsonDocument::fromJson(process.readAllStandardOutput()).object();
@@ -91,20 +91,21 @@ std::optional<QJsonObject> pefileReading(const QString& exe)
 
 QStringList realPeFiles(int maxFiles)
 {
-    QStringList roots { QStringLiteral("/usr/lib/gcc/x86_64-w64-mingw32"), QStringLiteral("/usr/lib/gcc/i686-w64-mingw32"),
-        QStringLiteral("/usr/x86_64-w64-mingw32/lib"), QStringLiteral("/usr/i686-w64-mingw32/lib"),
-        QStringLiteral("/usr/lib/python3"), QStringLiteral("/usr/share/python-wheels"),
-        QStringLiteral("/usr/lib/wine"), QStringLiteral("/usr/lib/x86_64-linux-gnu/wine"),
-        QStringLiteral("/usr/share/wine"), QStringLiteral("/usr/lib/perf-core"),
-        QStringLiteral("/usr/lib/google-cloud-sdk/platform"), QDir::homePath() + QStringLiteral("/.pyenv/versions") };
+    QStringList roots {QStringLiteral("/usr/lib/gcc/x86_64-w64-mingw32"),
+        QStringLiteral("/usr/lib/gcc/i686-w64-mingw32"), QStringLiteral("/usr/x86_64-w64-mingw32/lib"),
+        QStringLiteral("/usr/i686-w64-mingw32/lib"), QStringLiteral("/usr/lib/python3"),
+        QStringLiteral("/usr/share/python-wheels"), QStringLiteral("/usr/lib/wine"),
+        QStringLiteral("/usr/lib/x86_64-linux-gnu/wine"), QStringLiteral("/usr/share/wine"),
+        QStringLiteral("/usr/lib/perf-core"), QStringLiteral("/usr/lib/google-cloud-sdk/platform"),
+        QDir::homePath() + QStringLiteral("/.pyenv/versions")};
     const QString extra = qEnvironmentVariable("BRIMVAULT_PE_CORPUS");
     if (!extra.isEmpty())
         roots = extra.split(u':', Qt::SkipEmptyParts) + roots;
     QStringList files;
     QSet<QByteArray> seen;
     for (const QString& root : roots) {
-        QDirIterator it(root, { QStringLiteral("*.exe"), QStringLiteral("*.dll") }, QDir::Files,
-            QDirIterator::Subdirectories);
+        QDirIterator it(
+            root, {QStringLiteral("*.exe"), QStringLiteral("*.dll")}, QDir::Files, QDirIterator::Subdirectories);
         while (it.hasNext() && files.size() < maxFiles) {
             const QString path = it.next();
             QFile file(path);

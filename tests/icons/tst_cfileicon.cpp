@@ -46,8 +46,8 @@ private:
 
     static QByteArray threeImageIcon()
     {
-        return buildIconFile({ { 16, 16, 16, 1, 4, blankBitmap(16, 16, 4) }, { 32, 32, 0, 1, 8, blankBitmap(32, 32, 8) },
-            { 48, 48, 0, 1, 32, blankBitmap(48, 48, 32) } });
+        return buildIconFile({{16, 16, 16, 1, 4, blankBitmap(16, 16, 4)}, {32, 32, 0, 1, 8, blankBitmap(32, 32, 8)},
+            {48, 48, 0, 1, 32, blankBitmap(48, 48, 32)}});
     }
 
 private Q_SLOTS:
@@ -58,13 +58,13 @@ private Q_SLOTS:
         QTest::addColumn<int>("countAfter");
 
         const QByteArray image = blankBitmap(16, 16, 4);
-        QByteArray shortImages = buildIconFile({ { 16, 16, 16, 1, 4, image } });
+        QByteArray shortImages = buildIconFile({{16, 16, 16, 1, 4, image}});
         shortImages.chop(10);
-        QByteArray hugeSize = buildIconFile({ { 16, 16, 16, 1, 4, image } });
+        QByteArray hugeSize = buildIconFile({{16, 16, 16, 1, 4, image}});
         qToLittleEndian<quint32>(0xFFFFFFF0u, hugeSize.data() + 6 + 8);
-        QByteArray pastEnd = buildIconFile({ { 16, 16, 16, 1, 4, image } });
+        QByteArray pastEnd = buildIconFile({{16, 16, 16, 1, 4, image}});
         qToLittleEndian<quint32>(0x7FFFFFF0u, pastEnd.data() + 6 + 12);
-        QByteArray missingEntry = buildIconFile({ { 16, 16, 16, 1, 4, image } }).left(6 + 16);
+        QByteArray missingEntry = buildIconFile({{16, 16, 16, 1, 4, image}}).left(6 + 16);
         qToLittleEndian<quint16>(2, missingEntry.data() + 4);
 
         QTest::newRow("no images") << QByteArray("\0\0\1\0\0\0", 6) << "Icon contains no images." << 0;
@@ -127,7 +127,7 @@ private Q_SLOTS:
     void loadKeepsOffsetsAsGiven()
     {
         // A gap between directory and image: the offset is kept, the image read from where it points.
-        QByteArray bytes = buildIconFile({ { 16, 16, 16, 1, 4, blankBitmap(16, 16, 4) } });
+        QByteArray bytes = buildIconFile({{16, 16, 16, 1, 4, blankBitmap(16, 16, 4)}});
         bytes.insert(22, QByteArray(10, 'x'));
         qToLittleEndian<quint32>(32, bytes.data() + 6 + 12);
         cFileIcon icon;
@@ -157,8 +157,8 @@ private Q_SLOTS:
         QFETCH(qint64, expected);
         const QByteArray image = blankBitmap(24, 16, 8);
         cFileIcon icon;
-        QVERIFY(icon.LoadIcon(write(QStringLiteral("q.ico"),
-            buildIconFile({ { 24, 16, quint8(colourCount), 1, quint16(bitCount), image } }))));
+        QVERIFY(icon.LoadIcon(write(
+            QStringLiteral("q.ico"), buildIconFile({{24, 16, quint8(colourCount), 1, quint16(bitCount), image}}))));
         QCOMPARE(icon.ImageColourCount(1), expected);
         QCOMPARE(icon.ImageWidth(1), 24);
         QCOMPARE(icon.ImageHeight(1), 16);
@@ -320,11 +320,11 @@ private Q_SLOTS:
         QTest::addColumn<int>("index");
         QTest::addColumn<QList<int>>("keptWidths");
         QTest::addColumn<bool>("packed");
-        QTest::newRow("first") << 1 << QList<int> { 32, 48 } << true;
-        QTest::newRow("middle") << 2 << QList<int> { 16, 48 } << true;
-        QTest::newRow("last") << 3 << QList<int> { 16, 32 } << true;
+        QTest::newRow("first") << 1 << QList<int> {32, 48} << true;
+        QTest::newRow("middle") << 2 << QList<int> {16, 48} << true;
+        QTest::newRow("last") << 3 << QList<int> {16, 32} << true;
         // Not found: the count still falls and the last place goes, offsets untouched.
-        QTest::newRow("outside") << 7 << QList<int> { 16, 32 } << false;
+        QTest::newRow("outside") << 7 << QList<int> {16, 32} << false;
     }
 
     void removeImage()

@@ -17,13 +17,13 @@ private:
 
     static QStringList fields(const clsFileVersion& version)
     {
-        return { version.CompanyName(), version.FileDescription(), version.FileVersion(), version.InternalName(),
-            version.LegalCopyright(), version.OriginalFileName(), version.ProductName(), version.ProductVersion() };
+        return {version.CompanyName(), version.FileDescription(), version.FileVersion(), version.InternalName(),
+            version.LegalCopyright(), version.OriginalFileName(), version.ProductName(), version.ProductVersion()};
     }
 
     // A VS_VERSIONINFO node: header, key, padding, value, padding, children.
-    static QByteArray node(const QString& key, const QByteArray& value, quint16 type, quint16 valueLength,
-        const QByteArray& children = {})
+    static QByteArray node(
+        const QString& key, const QByteArray& value, quint16 type, quint16 valueLength, const QByteArray& children = {})
     {
         QByteArray out(6, '\0');
         out.append(reinterpret_cast<const char*>(key.utf16()), key.size() * 2).append(2, '\0');
@@ -53,16 +53,19 @@ private Q_SLOTS:
         QTest::addColumn<QString>("file");
         QTest::addColumn<QString>("translation");
         QTest::addColumn<QStringList>("expected");
-        QTest::newRow("all fields") << "multi64.exe" << "040904B0"
-                                    << QStringList { u"Fixture Works"_s, u"Marble Cascade"_s, u"1.2.3.4"_s, u"marble"_s,
-                                           u"(c) Fixture Works"_s, u"marble.exe"_s, u"Marble Cascade Deluxe"_s, u"1.2"_s };
-        QTest::newRow("Russian, code page 1251")
-            << "ver_ru32.exe" << "041904E3"
-            << QStringList { u"Студия Пример"_s, u"Весёлые шарики"_s, u"2.0.0.1"_s, u""_s, u""_s, u""_s,
-                   u"Шарики"_s, u""_s };
-        QTest::newRow("no description") << "ver_nodesc64.exe" << "040904E4"
-                                        << QStringList { u"Nameless Games"_s, u""_s, u"3.1"_s, u"nodesc"_s, u""_s, u"nodesc.exe"_s,
-                                               u"No Description"_s, u"3.1"_s };
+        QTest::newRow("all fields") << "multi64.exe"
+                                    << "040904B0"
+                                    << QStringList {u"Fixture Works"_s, u"Marble Cascade"_s, u"1.2.3.4"_s, u"marble"_s,
+                                           u"(c) Fixture Works"_s, u"marble.exe"_s, u"Marble Cascade Deluxe"_s,
+                                           u"1.2"_s};
+        QTest::newRow("Russian, code page 1251") << "ver_ru32.exe"
+                                                 << "041904E3"
+                                                 << QStringList {u"Студия Пример"_s, u"Весёлые шарики"_s, u"2.0.0.1"_s,
+                                                        u""_s, u""_s, u""_s, u"Шарики"_s, u""_s};
+        QTest::newRow("no description") << "ver_nodesc64.exe"
+                                        << "040904E4"
+                                        << QStringList {u"Nameless Games"_s, u""_s, u"3.1"_s, u"nodesc"_s, u""_s,
+                                               u"nodesc.exe"_s, u"No Description"_s, u"3.1"_s};
     }
 
     void fixtures()
@@ -134,21 +137,25 @@ private Q_SLOTS:
         };
         const QByteArray fixed(52, '\0');
         const QByteArray acme = text(QStringLiteral("Acme"));
-        QTest::newRow("plain") << node(QStringLiteral("VS_VERSION_INFO"), fixed, 0, 52,
-            strings(QStringLiteral("041904E3"), acme, 5) + vars) << "041904E3"
+        QTest::newRow("plain") << node(
+            QStringLiteral("VS_VERSION_INFO"), fixed, 0, 52, strings(QStringLiteral("041904E3"), acme, 5) + vars)
+                               << "041904E3"
                                << "Acme";
-        QTest::newRow("keys in other case") << node(QStringLiteral("VS_VERSION_INFO"), fixed, 0, 52,
-            strings(QStringLiteral("041904e3"), acme, 5) + vars) << "041904E3"
+        QTest::newRow("keys in other case") << node(
+            QStringLiteral("VS_VERSION_INFO"), fixed, 0, 52, strings(QStringLiteral("041904e3"), acme, 5) + vars)
+                                            << "041904E3"
                                             << "Acme";
-        QTest::newRow("length in bytes") << node(QStringLiteral("VS_VERSION_INFO"), fixed, 0, 52,
-            strings(QStringLiteral("041904E3"), acme, 10) + vars) << "041904E3"
+        QTest::newRow("length in bytes") << node(
+            QStringLiteral("VS_VERSION_INFO"), fixed, 0, 52, strings(QStringLiteral("041904E3"), acme, 10) + vars)
+                                         << "041904E3"
                                          << "Acme";
-        QTest::newRow("text with a NUL inside")
-            << node(QStringLiteral("VS_VERSION_INFO"), fixed, 0, 52,
-                   strings(QStringLiteral("041904E3"), text(QStringLiteral("Ac")) + text(QStringLiteral("me")), 6) + vars)
-            << "041904E3" << "Ac";
-        QTest::newRow("table under another name") << node(QStringLiteral("VS_VERSION_INFO"), fixed, 0, 52,
-            strings(QStringLiteral("040904B0"), acme, 5) + vars) << "041904E3"
+        QTest::newRow("text with a NUL inside") << node(QStringLiteral("VS_VERSION_INFO"), fixed, 0, 52,
+            strings(QStringLiteral("041904E3"), text(QStringLiteral("Ac")) + text(QStringLiteral("me")), 6) + vars)
+                                                << "041904E3"
+                                                << "Ac";
+        QTest::newRow("table under another name") << node(
+            QStringLiteral("VS_VERSION_INFO"), fixed, 0, 52, strings(QStringLiteral("040904B0"), acme, 5) + vars)
+                                                  << "041904E3"
                                                   << "";
     }
 
@@ -169,7 +176,8 @@ private Q_SLOTS:
         const QByteArray vars = node(QStringLiteral("VarFileInfo"), {}, 1, 0,
             node(QStringLiteral("Translation"), QByteArray("\x09\x04", 2), 0, 2));
         QTest::newRow("empty") << QByteArray();
-        QTest::newRow("short translation") << node(QStringLiteral("VS_VERSION_INFO"), QByteArray(52, '\0'), 0, 52, vars);
+        QTest::newRow("short translation")
+            << node(QStringLiteral("VS_VERSION_INFO"), QByteArray(52, '\0'), 0, 52, vars);
         QByteArray zeroLength = node(QStringLiteral("VS_VERSION_INFO"), {}, 0, 0, QByteArray(64, '\0'));
         QTest::newRow("children of length 0") << zeroLength;
         QByteArray tooLong = node(QStringLiteral("VS_VERSION_INFO"), {}, 0, 0, vars);

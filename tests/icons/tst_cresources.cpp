@@ -69,8 +69,8 @@ private Q_SLOTS:
     void orderMatchesPefile_data()
     {
         QTest::addColumn<QString>("file");
-        for (const char* name : { "multi32.exe", "multi64.exe", "twogroups32.exe", "twogroups64.exe", "broken64.exe",
-                 "ver_ru32.exe", "ver_nodesc64.exe" })
+        for (const char* name : {"multi32.exe", "multi64.exe", "twogroups32.exe", "twogroups64.exe", "broken64.exe",
+                 "ver_ru32.exe", "ver_nodesc64.exe"})
             QTest::newRow(name) << IconTest::peFixture(QString::fromLatin1(name));
     }
 
@@ -162,8 +162,8 @@ private Q_SLOTS:
         QTest::addColumn<quint32>("number");
         QTest::addColumn<QString>("source");
         QTest::addColumn<QString>("message");
-        QTest::newRow("missing file") << m_env.path(QStringLiteral("none.exe")) << false << 0x80040419u
-                                      << ".cResources" << "The system cannot find the file specified.";
+        QTest::newRow("missing file") << m_env.path(QStringLiteral("none.exe")) << false << 0x80040419u << ".cResources"
+                                      << "The system cannot find the file specified.";
         QTest::newRow("not an executable") << QStringLiteral(BRIMVAULT_SOURCE_DIR "/tests/icons/pe_reference.py")
                                            << false << 0x80040419u << ".cResources"
                                            << "%1 is not a valid Win32 application.";

@@ -47,8 +47,8 @@ private Q_SLOTS:
     {
         QTest::addColumn<QString>("file");
         QTest::addColumn<QString>("group");
-        for (const char* name : { "multi32.exe", "multi64.exe", "twogroups32.exe", "twogroups64.exe", "broken32.exe",
-                 "broken64.exe" })
+        for (const char* name :
+            {"multi32.exe", "multi64.exe", "twogroups32.exe", "twogroups64.exe", "broken32.exe", "broken64.exe"})
             QTest::newRow(name) << IconTest::peFixture(QString::fromLatin1(name)) << QString();
         QTest::newRow("badsize64.exe") << IconTest::peFixture(QStringLiteral("badsize64.exe")) << "-";
         QTest::newRow("nores32.exe") << IconTest::peFixture(QStringLiteral("nores32.exe")) << "-";
@@ -126,7 +126,7 @@ private Q_SLOTS:
         QProcessEnvironment environment = QProcessEnvironment::systemEnvironment();
         environment.insert(QStringLiteral("XDG_RUNTIME_DIR"), runtime);
         process.setProcessEnvironment(environment);
-        process.start(program, { QStringLiteral("--version-info"), exe });
+        process.start(program, {QStringLiteral("--version-info"), exe});
         QVERIFY(process.waitForFinished(60000));
         QCOMPARE(process.exitCode(), 0);
         const QString out = QString::fromUtf8(process.readAllStandardOutput());
@@ -134,14 +134,16 @@ private Q_SLOTS:
         QVERIFY(out.contains(QStringLiteral("\nFileDescription=Весёлые шарики\n")));
 
         const QString ico = m_env.path(QStringLiteral("program.ico"));
-        process.start(program, { QStringLiteral("--extract-icon"), IconTest::peFixture(QStringLiteral("multi64.exe")), ico });
+        process.start(
+            program, {QStringLiteral("--extract-icon"), IconTest::peFixture(QStringLiteral("multi64.exe")), ico});
         QVERIFY(process.waitForFinished(60000));
         QCOMPARE(process.exitCode(), 0);
         cFileIcon icon;
         QVERIFY(icon.LoadIcon(ico));
         QCOMPARE(icon.ImageCount(), 5);
 
-        process.start(program, { QStringLiteral("--extract-icon"), IconTest::peFixture(QStringLiteral("nores64.exe")), ico });
+        process.start(
+            program, {QStringLiteral("--extract-icon"), IconTest::peFixture(QStringLiteral("nores64.exe")), ico});
         QVERIFY(process.waitForFinished(60000));
         QCOMPARE(process.exitCode(), 1);
         const QByteArray reason = process.readAllStandardError();
@@ -197,8 +199,8 @@ private Q_SLOTS:
         } else {
             QCOMPARE(exitCode, 0);
             const QJsonObject expected = version.toObject();
-            QString wanted = QStringLiteral("Translation=") + expected.value(QStringLiteral("translation")).toString()
-                + u'\n';
+            QString wanted
+                = QStringLiteral("Translation=") + expected.value(QStringLiteral("translation")).toString() + u'\n';
             const QJsonObject fields = expected.value(QStringLiteral("fields")).toObject();
             // Keys match without regard to case, as the platform's version query matches them.
             for (const QString& name : VersionFieldNames()) {

@@ -54,20 +54,18 @@ private Q_SLOTS:
         QTest::addColumn<QList<QList<int>>>("images"); // width, colour count, bit count
         QTest::addColumn<int>("depth");
         QTest::addColumn<int>("best");
-        QTest::newRow("32 wide beats closer depth") << QList<QList<int>> { { 16, 0, 8 }, { 48, 0, 32 }, { 32, 16, 4 } }
-                                                    << 32 << 3;
+        QTest::newRow("32 wide beats closer depth")
+            << QList<QList<int>> {{16, 0, 8}, {48, 0, 32}, {32, 16, 4}} << 32 << 3;
         QTest::newRow("exact match returns at once")
-            << QList<QList<int>> { { 16, 0, 8 }, { 48, 0, 32 }, { 32, 16, 4 }, { 32, 0, 32 } } << 32 << 4;
+            << QList<QList<int>> {{16, 0, 8}, {48, 0, 32}, {32, 16, 4}, {32, 0, 32}} << 32 << 4;
         QTest::newRow("closest depth among 32 wide")
-            << QList<QList<int>> { { 32, 2, 1 }, { 32, 0, 8 }, { 32, 16, 4 } } << 24 << 2;
-        QTest::newRow("ties keep the first") << QList<QList<int>> { { 32, 0, 8 }, { 32, 0, 8 } } << 16 << 1;
-        QTest::newRow("closest width without 32") << QList<QList<int>> { { 16, 0, 8 }, { 48, 0, 8 }, { 24, 0, 8 } } << 8
-                                                  << 3;
-        QTest::newRow("256 counts as width 0") << QList<QList<int>> { { 0, 0, 32 }, { 64, 0, 32 } } << 32 << 1;
-        QTest::newRow("no other width after a 32")
-            << QList<QList<int>> { { 32, 2, 1 }, { 31, 0, 32 } } << 32 << 1;
+            << QList<QList<int>> {{32, 2, 1}, {32, 0, 8}, {32, 16, 4}} << 24 << 2;
+        QTest::newRow("ties keep the first") << QList<QList<int>> {{32, 0, 8}, {32, 0, 8}} << 16 << 1;
+        QTest::newRow("closest width without 32") << QList<QList<int>> {{16, 0, 8}, {48, 0, 8}, {24, 0, 8}} << 8 << 3;
+        QTest::newRow("256 counts as width 0") << QList<QList<int>> {{0, 0, 32}, {64, 0, 32}} << 32 << 1;
+        QTest::newRow("no other width after a 32") << QList<QList<int>> {{32, 2, 1}, {31, 0, 32}} << 32 << 1;
         QTest::newRow("closest depth on a 16-bit display")
-            << QList<QList<int>> { { 32, 0, 32 }, { 32, 0, 24 }, { 32, 0, 4 } } << 16 << 2;
+            << QList<QList<int>> {{32, 0, 32}, {32, 0, 24}, {32, 0, 4}} << 16 << 2;
     }
 
     void bestImage()
@@ -77,8 +75,8 @@ private Q_SLOTS:
         QFETCH(int, best);
         QList<IconTest::ImageSpec> specs;
         for (const QList<int>& image : images)
-            specs.append({ quint8(image.at(0)), quint8(image.at(0)), quint8(image.at(1)), 1, quint16(image.at(2)),
-                blankBitmap(4, 4, 4) });
+            specs.append({quint8(image.at(0)), quint8(image.at(0)), quint8(image.at(1)), 1, quint16(image.at(2)),
+                blankBitmap(4, 4, 4)});
         const cFileIcon icon = load(buildIconFile(specs));
         QCOMPARE(icon.bestIconIndex(depth), best);
     }
@@ -94,7 +92,7 @@ private Q_SLOTS:
     void maskMakesTransparency()
     {
         // Row 0: colour 1000, mask 0011; row 1: colour 0000, mask 1000.
-        const cFileIcon icon = load(buildIconFile({ { 4, 2, 2, 1, 1, oneBit(0x80, 0x00, 0x30, 0x80) } }));
+        const cFileIcon icon = load(buildIconFile({{4, 2, 2, 1, 1, oneBit(0x80, 0x00, 0x30, 0x80)}}));
         const QImage picture = icon.IconHandle(1);
         QCOMPARE(picture.size(), QSize(4, 2));
         QCOMPARE(picture.pixel(0, 0), qRgba(255, 255, 255, 255));
@@ -107,7 +105,7 @@ private Q_SLOTS:
 
     void drawingMaskThenColourShowsTheBackground()
     {
-        const cFileIcon icon = load(buildIconFile({ { 4, 2, 2, 1, 1, oneBit(0x80, 0x00, 0x30, 0x80) } }));
+        const cFileIcon icon = load(buildIconFile({{4, 2, 2, 1, 1, oneBit(0x80, 0x00, 0x30, 0x80)}}));
         QImage canvas(8, 4, QImage::Format_RGB32);
         canvas.fill(qRgb(10, 200, 30));
         QPainter painter(&canvas);
@@ -229,7 +227,7 @@ private Q_SLOTS:
         QFETCH(QSize, size);
         QFETCH(int, alphaAt00);
         // Directory entries of real files are not always right: planes and bit count 0 here.
-        const cFileIcon icon = load(buildIconFile({ { 0, 0, 0, 0, 0, image } }));
+        const cFileIcon icon = load(buildIconFile({{0, 0, 0, 0, 0, image}}));
         const QImage picture = icon.IconHandle(1);
         QCOMPARE(picture.size(), size);
         if (!size.isEmpty())

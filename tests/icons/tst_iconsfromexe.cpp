@@ -32,7 +32,7 @@ private Q_SLOTS:
         QTest::addColumn<bool>("found");
         QTest::addColumn<QVariant>("resourceId");
         QTest::addColumn<int>("images");
-        for (const QString& arch : { QStringLiteral("32"), QStringLiteral("64") }) {
+        for (const QString& arch : {QStringLiteral("32"), QStringLiteral("64")}) {
             const auto row = [&](const char* name) -> QTestData& {
                 return QTest::newRow(qPrintable(QString::fromLatin1(name) + arch))
                     << IconTest::peFixture(QString::fromLatin1(name) + arch + QStringLiteral(".exe"));
@@ -46,8 +46,8 @@ private Q_SLOTS:
             row("nores") << false << QVariant() << 0;
         }
         QTest::newRow("missing file") << m_env.path(QStringLiteral("none.exe")) << false << QVariant() << 0;
-        QTest::newRow("not an executable") << IconTest::iconInput(QStringLiteral("main.ico")) << false << QVariant()
-                                           << 0;
+        QTest::newRow("not an executable")
+            << IconTest::iconInput(QStringLiteral("main.ico")) << false << QVariant() << 0;
     }
 
     void mainIcon()
@@ -77,12 +77,13 @@ private Q_SLOTS:
         QTest::newRow("sizes disagree") << broken << 2 << QString() << false << QVariant();
         QTest::newRow("image id above 32767") << broken << 3 << QString() << false << QVariant();
         QTest::newRow("good id") << broken << 4 << QString() << true << QVariant(4);
-        QTest::newRow("good id as #text") << broken << 0 << QStringLiteral("#4") << true << QVariant(QStringLiteral("#4"));
+        QTest::newRow("good id as #text")
+            << broken << 0 << QStringLiteral("#4") << true << QVariant(QStringLiteral("#4"));
         QTest::newRow("name") << two << 0 << QStringLiteral("APPICON") << true << QVariant(QStringLiteral("APPICON"));
-        QTest::newRow("name in lower case") << two << 0 << QStringLiteral("appicon") << true
-                                            << QVariant(QStringLiteral("appicon"));
-        QTest::newRow("unknown id falls back on the name") << two << 99 << QStringLiteral("APPICON") << true
-                                                           << QVariant(QStringLiteral("APPICON"));
+        QTest::newRow("name in lower case")
+            << two << 0 << QStringLiteral("appicon") << true << QVariant(QStringLiteral("appicon"));
+        QTest::newRow("unknown id falls back on the name")
+            << two << 99 << QStringLiteral("APPICON") << true << QVariant(QStringLiteral("APPICON"));
         QTest::newRow("id wins over name") << two << 2 << QStringLiteral("APPICON") << true << QVariant(2);
         QTest::newRow("neither") << two << 99 << QStringLiteral("OTHER") << false << QVariant();
     }
@@ -123,12 +124,13 @@ private Q_SLOTS:
         QTest::addColumn<QString>("file");
         QTest::addColumn<int>("id");
         QTest::addColumn<QString>("name");
-        for (const QString& arch : { QStringLiteral("32"), QStringLiteral("64") }) {
+        for (const QString& arch : {QStringLiteral("32"), QStringLiteral("64")}) {
             const QString multi = IconTest::peFixture(QStringLiteral("multi") + arch + QStringLiteral(".exe"));
             const QString two = IconTest::peFixture(QStringLiteral("twogroups") + arch + QStringLiteral(".exe"));
             const QString broken = IconTest::peFixture(QStringLiteral("broken") + arch + QStringLiteral(".exe"));
             QTest::newRow(qPrintable(QStringLiteral("multi") + arch)) << multi << 1 << QString();
-            QTest::newRow(qPrintable(QStringLiteral("twogroups named ") + arch)) << two << 0 << QStringLiteral("APPICON");
+            QTest::newRow(qPrintable(QStringLiteral("twogroups named ") + arch))
+                << two << 0 << QStringLiteral("APPICON");
             QTest::newRow(qPrintable(QStringLiteral("twogroups 2 ") + arch)) << two << 2 << QString();
             QTest::newRow(qPrintable(QStringLiteral("broken 4 ") + arch)) << broken << 4 << QString();
         }
@@ -154,7 +156,7 @@ private Q_SLOTS:
     void truncatedExecutablesNeverLoadPartly_data()
     {
         QTest::addColumn<int>("keep");
-        for (int keep : { 0, 2, 64, 200, 400, 1024, 4096, 6000, 9000, 12000, 16000 })
+        for (int keep : {0, 2, 64, 200, 400, 1024, 4096, 6000, 9000, 12000, 16000})
             QTest::newRow(qPrintable(QString::number(keep))) << keep;
     }
 
@@ -172,12 +174,13 @@ private Q_SLOTS:
         cFileIcon icon;
         if (icon.LoadMainIconFromEXE(path)) {
             QCOMPARE(icon.ImageCount(), 5);
-            QCOMPARE(icon.toIconFile().size(), qsizetype(6 + 16 * 5) + [&] {
-                qsizetype sum = 0;
-                for (int i = 1; i <= 5; ++i)
-                    sum += icon.ImageSize(i);
-                return sum;
-            }());
+            QCOMPARE(
+                icon.toIconFile().size(), qsizetype(6 + 16 * 5) + [&] {
+                    qsizetype sum = 0;
+                    for (int i = 1; i <= 5; ++i)
+                        sum += icon.ImageSize(i);
+                    return sum;
+                }());
         } else {
             QCOMPARE(icon.ImageCount(), 0);
         }

@@ -12,8 +12,7 @@ public:
         , m_width(widthPixels)
         , m_height(heightPixels)
         , m_frameRate(frameRate)
-    {
-    }
+    { }
 
     void setBackgroundColor(quint8 red, quint8 green, quint8 blue)
     {
@@ -71,6 +70,13 @@ public:
     }
     static QByteArray callMethod(const QString& name) { return push({name}) + "\x52"; }
     static QByteArray pop() { return QByteArray("\x17", 1); }
+    static QByteArray getUrl(const QByteArray& url, const QByteArray& target)
+    {
+        const QByteArray data = url + '\0' + target + '\0';
+        QByteArray action("\x83", 1);
+        appendLe16(action, quint16(data.size()));
+        return action + data;
+    }
 
 private:
     void addTag(quint16 code, const QByteArray& data)

@@ -83,7 +83,8 @@ private Q_SLOTS:
         QTest::addColumn<QString>("setting");
         QTest::addColumn<QString>("expected");
         QTest::newRow("default") << QByteArray() << QString() << DefaultCatalogueRoot();
-        QTest::newRow("setting") << QByteArray() << "http://games.example/" << "http://games.example";
+        QTest::newRow("setting") << QByteArray() << "http://games.example/"
+                                 << "http://games.example";
         QTest::newRow("environment wins") << QByteArray("http://127.0.0.1:8080//") << "http://games.example"
                                           << "http://127.0.0.1:8080";
         QTest::newRow("blank environment is unset") << QByteArray("  ") << "http://games.example"

@@ -2,9 +2,13 @@
 #include "TestEnvironment.h"
 
 #include "media/BrowserEmulation.h"
+#include "media/ReclamaOnClose.h"
+#include "media/ReclamaSchedule.h"
 #include "media/WebEngineStartup.h"
 #include "media/frmReclama.h"
+#include "store/DataFolders.h"
 #include "store/IniDocument.h"
+#include "store/clsFileBag.h"
 #include "support/UserPrompt.h"
 
 #include <QApplication>
@@ -151,8 +155,8 @@ private Q_SLOTS:
         QVERIFY(window->isMaximized());
         QCOMPARE(window->DisplayModeValue(), int(frmReclama::ModeWebPage));
         QVERIFY(window->oIE());
-        QTRY_COMPARE_WITH_TIMEOUT(evaluate(window->oIE(), QStringLiteral("!!document.getElementById('next')")),
-            QVariant(true), WebTimeout);
+        QTRY_COMPARE_WITH_TIMEOUT(
+            evaluate(window->oIE(), QStringLiteral("!!document.getElementById('next')")), QVariant(true), WebTimeout);
         QVERIFY(!window->pbGoBack()->isVisible());
 
         // The first page of a window writes both browser-emulation values.
@@ -206,8 +210,8 @@ private Q_SLOTS:
         QVERIFY(popup != window);
         QCOMPARE(popup->DisplayModeValue(), int(frmReclama::ModeWebPage));
         QTRY_COMPARE_WITH_TIMEOUT(pageUrl(popup), QStringLiteral("popup.html"), WebTimeout);
-        QTRY_COMPARE_WITH_TIMEOUT(evaluate(window->oIE(), QStringLiteral("!!window.opened")), QVariant(true),
-            WebTimeout);
+        QTRY_COMPARE_WITH_TIMEOUT(
+            evaluate(window->oIE(), QStringLiteral("!!window.opened")), QVariant(true), WebTimeout);
 
         popup->close();
         window->close();
@@ -229,10 +233,14 @@ private Q_SLOTS:
     {
         QTest::addColumn<QString>("address");
         QTest::addColumn<QString>("opened");
-        QTest::newRow("with address") << "http://ads.example/offer" << "http://ads.example/offer";
-        QTest::newRow("address with blanks") << "  http://ads.example/offer " << "http://ads.example/offer";
-        QTest::newRow("empty address") << "" << "";
-        QTest::newRow("blank address") << "   " << "";
+        QTest::newRow("with address") << "http://ads.example/offer"
+                                      << "http://ads.example/offer";
+        QTest::newRow("address with blanks") << "  http://ads.example/offer "
+                                             << "http://ads.example/offer";
+        QTest::newRow("empty address") << ""
+                                       << "";
+        QTest::newRow("blank address") << "   "
+                                       << "";
     }
 
     void stillPictureClickThrough()
@@ -274,6 +282,75 @@ private Q_SLOTS:
         QVERIFY(m_browser.urls.isEmpty());
     }
 
+    void webPageAdvertisement_data()
+    {
+        QTest::addColumn<QString>("address");
+        QTest::addColumn<QString>("shown");
+        QTest::newRow("the file when the address is empty") << ""
+                                                            << "Image_page.html";
+        QTest::newRow("the file when the address is blank") << "  "
+                                                            << "Image_page.html";
+        QTest::newRow("the address otherwise") << "landing.html"
+                                               << "landing.html";
+    }
+
+    void webPageAdvertisement()
+    {
+        QFETCH(QString, address);
+        QFETCH(QString, shown);
+        const QString advertisement = writeFile(QStringLiteral("Image_page.html"), pageWithBody("ad"));
+        const QString landing = writeFile(QStringLiteral("landing.html"), pageWithBody("landing"));
+        QPointer<frmReclama> window = new frmReclama();
+        window->ReclamaShow(advertisement, address.isEmpty() || address.trimmed().isEmpty() ? address : landing);
+        QVERIFY(window->isVisible());
+        QCOMPARE(window->size(), frmReclama::HostClientSize());
+        QCOMPARE(window->DisplayModeValue(), int(frmReclama::ModeWebPage));
+        QCOMPARE(window->cursor().shape(), Qt::ArrowCursor);
+        QTRY_COMPARE_WITH_TIMEOUT(pageUrl(window), shown, WebTimeout);
+        window->close();
+        QTRY_VERIFY(window.isNull());
+    }
+
+    void dueAdvertisementShowsOnClose_data()
+    {
+        QTest::addColumn<int>("mode");
+        QTest::addColumn<bool>("shown");
+        QTest::newRow("closed by the user") << int(ReclamaSchedule::UnloadMode::FormControlMenu) << true;
+        QTest::newRow("closed by the program") << int(ReclamaSchedule::UnloadMode::FormCode) << true;
+        QTest::newRow("system shutdown") << int(ReclamaSchedule::UnloadMode::AppWindows) << false;
+    }
+
+    void dueAdvertisementShowsOnClose()
+    {
+        QFETCH(int, mode);
+        QFETCH(bool, shown);
+        const QString folder = DataFolders::ReclamaFolder();
+        QVERIFY(folder.startsWith(m_env.root()));
+        QDir().mkpath(folder);
+        QImage picture(200, 100, QImage::Format_RGB32);
+        picture.fill(Qt::darkGreen);
+        QVERIFY(picture.save(QDir(folder).filePath(QStringLiteral("Image_close.png"))));
+        clsFileBag bag;
+        bag.SetCurrentFileName(QDir(folder).filePath(QStringLiteral("Reclama.ifb")));
+        bag.SetRecord(clsFileBag::MakeKey(QStringLiteral("image_close"), QStringLiteral("URL")),
+            QStringLiteral("http://ads.example/close"));
+        bag.SetRecord(clsFileBag::MakeKey(QStringLiteral("image_close"), QStringLiteral("DateShowFrom")),
+            QStringLiteral("X.X.X"));
+        bag.SetRecord(
+            clsFileBag::MakeKey(QStringLiteral("image_close"), QStringLiteral("DateShowTo")), QStringLiteral("X.X.X"));
+        QVERIFY(bag.SaveFile());
+
+        QCOMPARE(ShowDueReclama(static_cast<ReclamaSchedule::UnloadMode>(mode)), shown);
+        QPointer<frmReclama> window = findWindowTitled(QStringLiteral("Advertising"));
+        QCOMPARE(!window.isNull(), shown);
+        if (!window)
+            return;
+        QCOMPARE(window->DisplayModeValue(), int(frmReclama::ModeStillPicture));
+        QCOMPARE(window->ClickAddress(), QStringLiteral("http://ads.example/close"));
+        window->close();
+        QTRY_VERIFY(window.isNull());
+    }
+
     void flashMovieIsPlayedByRuffle()
     {
         SwfBuilder movie(8, 550, 400, 24.0);
@@ -281,8 +358,8 @@ private Q_SLOTS:
         // The movie asks for its page address and hands the answer back to the page.
         const QByteArray ask = SwfBuilder::push({QStringLiteral("window.location.href.toString"), 1})
             + SwfBuilder::externalInterface() + SwfBuilder::callMethod(QStringLiteral("call"));
-        const QByteArray echo = SwfBuilder::push({QStringLiteral("brimvaultEcho"), 2})
-            + SwfBuilder::externalInterface() + SwfBuilder::callMethod(QStringLiteral("call")) + SwfBuilder::pop();
+        const QByteArray echo = SwfBuilder::push({QStringLiteral("brimvaultEcho"), 2}) + SwfBuilder::externalInterface()
+            + SwfBuilder::callMethod(QStringLiteral("call")) + SwfBuilder::pop();
         movie.doAction(ask + echo);
         movie.showFrame();
         const QString path = writeFile(QStringLiteral("game with blanks.swf"), movie.bytes());
@@ -311,7 +388,8 @@ private Q_SLOTS:
         QCOMPARE(info.value(u"backgroundColor").toString().toLower(), QStringLiteral("#123456"));
 
         QTRY_COMPARE_WITH_TIMEOUT(
-            evaluate(window->oFlash(), QStringLiteral("JSON.stringify(window.brimvault.calls.map(c => [c.name, c.args]))"))
+            evaluate(
+                window->oFlash(), QStringLiteral("JSON.stringify(window.brimvault.calls.map(c => [c.name, c.args]))"))
                 .toString(),
             QStringLiteral("[[\"window.location.href.toString\",[]],[\"brimvaultEcho\",[\"http://127.0.0.1:9\"]]]"),
             WebTimeout);
@@ -319,6 +397,58 @@ private Q_SLOTS:
 
         window->close();
         QTRY_VERIFY(window.isNull());
+    }
+
+    void movieOpeningAPageHandsItToTheBrowser()
+    {
+        SwfBuilder movie(8, 100, 100, 12.0);
+        movie.doAction(SwfBuilder::getUrl("http://127.0.0.1:9/more-games", "_blank"));
+        movie.showFrame();
+        QPointer<frmReclama> window = new frmReclama();
+        window->RunGame(writeFile(QStringLiteral("opener.swf"), movie.bytes()));
+        QTRY_COMPARE_WITH_TIMEOUT(
+            m_browser.urls, QList<QUrl> {QUrl(QStringLiteral("http://127.0.0.1:9/more-games"))}, WebTimeout);
+        QVERIFY(!findWindowTitled(QStringLiteral("Online games")));
+        window->close();
+        QTRY_VERIFY(window.isNull());
+    }
+
+    void animatedPictureAdvertisementPlays()
+    {
+        // Two 1 x 1 frames, red then blue, 0.1 s each, looping.
+        QByteArray gif("GIF89a");
+        gif += QByteArray::fromHex("010001008001"
+                                   "00"
+                                   "ff0000"
+                                   "0000ff");
+        gif += QByteArray::fromHex("21ff0b") + "NETSCAPE2.0"
+            + QByteArray::fromHex("03010000"
+                                  "00");
+        for (const char* pixel : {"44", "4c"}) {
+            gif += QByteArray::fromHex("21f904"
+                                       "000a00"
+                                       "00"
+                                       "00");
+            gif += QByteArray::fromHex("2c"
+                                       "00000000"
+                                       "01000100"
+                                       "00");
+            gif += QByteArray::fromHex("0202") + QByteArray::fromHex(pixel) + QByteArray::fromHex("0100");
+        }
+        gif += QByteArray::fromHex("3b");
+        const QString path = writeFile(QStringLiteral("Image_blink.gif"), gif);
+
+        QPointer<frmReclama> window = new frmReclama();
+        window->ReclamaShow(path, QString());
+        QVERIFY(window->isVisible());
+        QCOMPARE(window->DisplayModeValue(), int(frmReclama::ModeStillPicture));
+        const auto centre = [&] { return window->grab().toImage().pixelColor(319, 239); };
+        QTRY_COMPARE_WITH_TIMEOUT(centre(), QColor(Qt::blue), 5000);
+        QTRY_COMPARE_WITH_TIMEOUT(centre(), QColor(Qt::red), 5000);
+
+        QTest::keyClick(window, Qt::Key_Escape);
+        QTRY_VERIFY(window.isNull());
+        QVERIFY(m_browser.urls.isEmpty());
     }
 
     void missingRuffleGivesItsMessage()
@@ -331,7 +461,8 @@ private Q_SLOTS:
         qputenv("BRIMVAULT_PROGRAM_DIR", BRIMVAULT_BIN_DIR);
 
         QCOMPARE(m_prompts.size(), 1);
-        QCOMPARE(m_prompts.constFirst().text, QStringLiteral("Macromedia Shockwave Flash Control not installed properly."));
+        QCOMPARE(
+            m_prompts.constFirst().text, QStringLiteral("Macromedia Shockwave Flash Control not installed properly."));
         QCOMPARE(m_prompts.constFirst().icon, PromptIcon::Critical);
         QTRY_VERIFY(window.isNull());
     }

@@ -90,23 +90,40 @@ private Q_SLOTS:
         QTest::addColumn<QDate>("today");
         QTest::addColumn<bool>("due");
 
-        QTest::newRow("winter on 20 December") << "1.12.X" << "31.1.X" << QDate(2026, 12, 20) << true;
-        QTest::newRow("winter on 10 January") << "1.12.X" << "31.1.X" << QDate(2027, 1, 10) << true;
-        QTest::newRow("winter on 1 March") << "1.12.X" << "31.1.X" << QDate(2027, 3, 1) << false;
-        QTest::newRow("winter on its first day") << "1.12.X" << "31.1.X" << QDate(2026, 12, 1) << true;
-        QTest::newRow("winter on its last day") << "1.12.X" << "31.1.X" << QDate(2027, 1, 31) << true;
-        QTest::newRow("winter on 30 November") << "1.12.X" << "31.1.X" << QDate(2026, 11, 30) << false;
-        QTest::newRow("winter on 1 February") << "1.12.X" << "31.1.X" << QDate(2027, 2, 1) << false;
-        QTest::newRow("every day") << "X.X.X" << "X.X.X" << QDate(2026, 7, 4) << true;
-        QTest::newRow("every day, leap day") << "X.X.X" << "X.X.X" << QDate(2028, 2, 29) << true;
-        QTest::newRow("fixed period inside") << "1.6.2026" << "30.6.2026" << QDate(2026, 6, 15) << true;
-        QTest::newRow("fixed period before") << "1.6.2026" << "30.6.2026" << QDate(2026, 5, 31) << false;
-        QTest::newRow("fixed period after") << "1.6.2026" << "30.6.2026" << QDate(2026, 7, 1) << false;
-        QTest::newRow("fixed period of last year") << "1.6.2025" << "30.6.2025" << QDate(2026, 6, 15) << false;
-        QTest::newRow("single day") << "15.6.X" << "15.6.X" << QDate(2026, 6, 15) << true;
-        QTest::newRow("single day, day after") << "15.6.X" << "15.6.X" << QDate(2026, 6, 16) << false;
-        QTest::newRow("this month") << "1.X.X" << "31.X.X" << QDate(2026, 4, 30) << true;
-        QTest::newRow("from today on for a year") << "X.X.X" << "X.X.2099" << QDate(2026, 4, 30) << true;
+        QTest::newRow("winter on 20 December") << "1.12.X"
+                                               << "31.1.X" << QDate(2026, 12, 20) << true;
+        QTest::newRow("winter on 10 January") << "1.12.X"
+                                              << "31.1.X" << QDate(2027, 1, 10) << true;
+        QTest::newRow("winter on 1 March") << "1.12.X"
+                                           << "31.1.X" << QDate(2027, 3, 1) << false;
+        QTest::newRow("winter on its first day") << "1.12.X"
+                                                 << "31.1.X" << QDate(2026, 12, 1) << true;
+        QTest::newRow("winter on its last day") << "1.12.X"
+                                                << "31.1.X" << QDate(2027, 1, 31) << true;
+        QTest::newRow("winter on 30 November") << "1.12.X"
+                                               << "31.1.X" << QDate(2026, 11, 30) << false;
+        QTest::newRow("winter on 1 February") << "1.12.X"
+                                              << "31.1.X" << QDate(2027, 2, 1) << false;
+        QTest::newRow("every day") << "X.X.X"
+                                   << "X.X.X" << QDate(2026, 7, 4) << true;
+        QTest::newRow("every day, leap day") << "X.X.X"
+                                             << "X.X.X" << QDate(2028, 2, 29) << true;
+        QTest::newRow("fixed period inside") << "1.6.2026"
+                                             << "30.6.2026" << QDate(2026, 6, 15) << true;
+        QTest::newRow("fixed period before") << "1.6.2026"
+                                             << "30.6.2026" << QDate(2026, 5, 31) << false;
+        QTest::newRow("fixed period after") << "1.6.2026"
+                                            << "30.6.2026" << QDate(2026, 7, 1) << false;
+        QTest::newRow("fixed period of last year") << "1.6.2025"
+                                                   << "30.6.2025" << QDate(2026, 6, 15) << false;
+        QTest::newRow("single day") << "15.6.X"
+                                    << "15.6.X" << QDate(2026, 6, 15) << true;
+        QTest::newRow("single day, day after") << "15.6.X"
+                                               << "15.6.X" << QDate(2026, 6, 16) << false;
+        QTest::newRow("this month") << "1.X.X"
+                                    << "31.X.X" << QDate(2026, 4, 30) << true;
+        QTest::newRow("from today on for a year") << "X.X.X"
+                                                  << "X.X.2099" << QDate(2026, 4, 30) << true;
     }
 
     void isDue()
@@ -128,9 +145,8 @@ private Q_SLOTS:
     void dueAdvertisementsOfAFolder()
     {
         const QString folder = freshFolder(QStringLiteral("ads"));
-        for (const char* name :
-            {"Image_winter.png", "Image_summer.swf", "Image_always.html", "Image_nourl.gif", "Image_norecord.jpg",
-                "image_lower.png", "Other_always.png", "Image_noextension"})
+        for (const char* name : {"Image_winter.png", "Image_summer.swf", "Image_always.html", "Image_nourl.gif",
+                 "Image_norecord.jpg", "image_lower.png", "Other_always.png", "Image_noextension"})
             touch(QDir(folder).filePath(QString::fromLatin1(name)));
         writeInfo(folder,
             {
@@ -287,13 +303,20 @@ private Q_SLOTS:
         QTest::addColumn<int>("start");
         QTest::addColumn<bool>("fromEnd");
         QTest::addColumn<QString>("expected");
-        QTest::newRow("first") << "a.b.c" << "." << 1 << false << "b.c";
-        QTest::newRow("last") << "a.b.c" << "." << 1 << true << "c";
-        QTest::newRow("from start") << "a.b.c" << "." << 3 << false << "c";
-        QTest::newRow("absent") << "abc" << "." << 1 << false << "abc";
-        QTest::newRow("absent from end") << "abc" << "." << 1 << true << "abc";
-        QTest::newRow("long separator") << "key::value" << "::" << 1 << false << "value";
-        QTest::newRow("at the end") << "abc." << "." << 1 << true << "";
+        QTest::newRow("first") << "a.b.c"
+                               << "." << 1 << false << "b.c";
+        QTest::newRow("last") << "a.b.c"
+                              << "." << 1 << true << "c";
+        QTest::newRow("from start") << "a.b.c"
+                                    << "." << 3 << false << "c";
+        QTest::newRow("absent") << "abc"
+                                << "." << 1 << false << "abc";
+        QTest::newRow("absent from end") << "abc"
+                                         << "." << 1 << true << "abc";
+        QTest::newRow("long separator") << "key::value"
+                                        << "::" << 1 << false << "value";
+        QTest::newRow("at the end") << "abc."
+                                    << "." << 1 << true << "";
     }
 
     void rightTo()

@@ -37,8 +37,8 @@ ServiceRun runService(const QStringList& arguments, int timeoutMs)
 bool craftPackage(const QString& kind, const QString& out)
 {
     QProcess python;
-    python.start(QStringLiteral("python3"),
-        {QStringLiteral(BRIMVAULT_SOURCE_DIR "/tests/service/craft_package.py"), kind, out});
+    python.start(
+        QStringLiteral("python3"), {QStringLiteral(BRIMVAULT_SOURCE_DIR "/tests/service/craft_package.py"), kind, out});
     return python.waitForFinished(120000) && python.exitStatus() == QProcess::NormalExit && python.exitCode() == 0;
 }
 
@@ -64,8 +64,8 @@ QStringList treeListing(const QString& root)
 {
     QStringList lines;
     const QDir rootDir(root);
-    QDirIterator it(root, QDir::AllEntries | QDir::Hidden | QDir::System | QDir::NoDotAndDotDot,
-        QDirIterator::Subdirectories);
+    QDirIterator it(
+        root, QDir::AllEntries | QDir::Hidden | QDir::System | QDir::NoDotAndDotDot, QDirIterator::Subdirectories);
     while (it.hasNext()) {
         const QFileInfo info(it.next());
         const QString relative = rootDir.relativeFilePath(info.filePath());
@@ -78,7 +78,8 @@ QStringList treeListing(const QString& root)
             QCryptographicHash hash(QCryptographicHash::Sha1);
             if (file.open(QIODevice::ReadOnly))
                 hash.addData(&file);
-            lines.append(relative + u' ' + QString::number(info.size()) + u' ' + QString::fromLatin1(hash.result().toHex()));
+            lines.append(
+                relative + u' ' + QString::number(info.size()) + u' ' + QString::fromLatin1(hash.result().toHex()));
         }
     }
     lines.sort();

@@ -1,5 +1,6 @@
 // Holds an install slot the way an installing service does, until killed or its standard input closes:
-// the tests use it to leave behind what an interrupted install leaves.
+// the tests use it to leave behind what an interrupted install leaves. With a second argument it keeps
+// holding the games folder lock as well, as an install killed during its final rename would.
 #include "StagingArea.h"
 
 #include <QDir>
@@ -9,16 +10,16 @@
 
 int main(int argc, char* argv[])
 {
-    if (argc != 2)
+    if (argc != 2 && argc != 3)
         return 2;
     const QString gamesFolder = QString::fromLocal8Bit(argv[1]);
     std::unique_ptr<Brimvault::InstallSlot> slot;
-    {
-        Brimvault::GamesFolderLock lock(gamesFolder);
-        if (!lock.isLocked())
-            return 1;
-        slot = Brimvault::InstallSlot::create(gamesFolder);
-    }
+    auto lock = std::make_unique<Brimvault::GamesFolderLock>(gamesFolder);
+    if (!lock->isLocked())
+        return 1;
+    slot = Brimvault::InstallSlot::create(gamesFolder);
+    if (argc == 2)
+        lock.reset();
     if (!slot)
         return 1;
     QDir(slot->path()).mkpath(QStringLiteral("Half/data"));
@@ -28,7 +29,6 @@ int main(int argc, char* argv[])
     part.close();
     std::printf("%s\n", QFile::encodeName(slot->path()).constData());
     std::fflush(stdout);
-    while (std::getchar() != EOF) {
-    }
+    while (std::getchar() != EOF) { }
     return 0;
 }

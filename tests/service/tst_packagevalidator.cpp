@@ -105,8 +105,8 @@ void TestPackageValidator::packages_data()
 
     const EntryHeader exe = header(u"Game/Game.exe"_s);
     QTest::newRow("minimal") << QList {exe} << QString();
-    QTest::newRow("with folder entries")
-        << QList {folder(u"Game/"_s), exe, folder(u"Game/data/"_s), header(u"Game/data/x"_s)} << QString();
+    QTest::newRow("with folder entries") << QList {folder(u"Game/"_s), exe, folder(u"Game/data/"_s),
+        header(u"Game/data/x"_s)} << QString();
     QTest::newRow("flash game") << QList {header(u"Game/movie.SWF"_s)} << QString();
     QTest::newRow("empty") << QList<EntryHeader> {} << u"empty"_s;
     QTest::newRow("no game file") << QList {header(u"Game/readme.txt"_s)} << u"no .exe or .swf"_s;
@@ -135,10 +135,10 @@ void TestPackageValidator::packages_data()
     QTest::newRow("same file twice") << QList {exe, exe} << u"twice"_s;
     QTest::newRow("same file in other case") << QList {exe, header(u"Game/GAME.EXE"_s)} << u"twice"_s;
     QTest::newRow("same folder twice") << QList {folder(u"Game/"_s), folder(u"Game/"_s), exe} << QString();
-    QTest::newRow("file then folder")
-        << QList {exe, header(u"Game/data"_s), header(u"Game/data/x"_s)} << u"both as a file and as a folder"_s;
-    QTest::newRow("folder then file")
-        << QList {exe, header(u"Game/data/x"_s), header(u"Game/Data"_s)} << u"both as a file and as a folder"_s;
+    QTest::newRow("file then folder") << QList {exe, header(u"Game/data"_s), header(u"Game/data/x"_s)}
+                                      << u"both as a file and as a folder"_s;
+    QTest::newRow("folder then file") << QList {exe, header(u"Game/data/x"_s), header(u"Game/Data"_s)}
+                                      << u"both as a file and as a folder"_s;
     QTest::newRow("explicit folder then file")
         << QList {exe, folder(u"Game/data/"_s), header(u"Game/data"_s)} << u"both as a file and as a folder"_s;
 }

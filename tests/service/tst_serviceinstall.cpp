@@ -67,8 +67,8 @@ QString TestServiceInstall::signal() const
 
 QString TestServiceInstall::makeGame(const QString& name, const QList<QPair<QString, QByteArray>>& files) const
 {
-    const QString folder = m_environment->path(u"sources/"_s + QString::number(qHash(name + files.first().first)))
-        + u'/' + name;
+    const QString folder
+        = m_environment->path(u"sources/"_s + QString::number(qHash(name + files.first().first))) + u'/' + name;
     for (const auto& [relative, bytes] : files)
         writeFile(folder + u'/' + relative, bytes);
     return folder;
@@ -115,14 +115,13 @@ void TestServiceInstall::refused_data()
     QTest::newRow("file beside the folder") << u"rootfile"_s << QStringList() << u"outside the game's folder"_s;
     QTest::newRow("no game file") << u"nogame"_s << QStringList() << u"no .exe or .swf"_s;
     QTest::newRow("reserved folder") << u"reserved"_s << QStringList() << u"reserved"_s;
-    QTest::newRow("over the size limit")
-        << u"big"_s << QStringList {PackageLimitKeys::MaxUnpackedMegabytes, u"2"_s} << u"limit of 2 MB"_s;
+    QTest::newRow("over the size limit") << u"big"_s << QStringList {PackageLimitKeys::MaxUnpackedMegabytes, u"2"_s}
+                                         << u"limit of 2 MB"_s;
     QTest::newRow("over the ratio limit") << u"ratio"_s << QStringList() << u"to 1, beyond the limit"_s;
-    QTest::newRow("not enough space")
-        << u"huge"_s
-        << QStringList {PackageLimitKeys::MaxUnpackedMegabytes, u"1000000000000"_s,
-               PackageLimitKeys::MaxCompressionRatio, u"1000000000000000"_s}
-        << u"not enough free space"_s;
+    QTest::newRow("not enough space") << u"huge"_s
+                                      << QStringList {PackageLimitKeys::MaxUnpackedMegabytes, u"1000000000000"_s,
+                                             PackageLimitKeys::MaxCompressionRatio, u"1000000000000000"_s}
+                                      << u"not enough free space"_s;
     QTest::newRow("not a zip") << u"notzip"_s << QStringList() << u"not a game package"_s;
     QTest::newRow("empty file") << u"empty"_s << QStringList() << u"not a game package"_s;
     QTest::newRow("truncated") << u"truncated"_s << QStringList() << u"damaged"_s;
@@ -160,7 +159,7 @@ void TestServiceInstall::pipeEntryLandsAsPlainFile()
     QVERIFY(craftPackage(u"fifo"_s, package));
     const ServiceRun run = runService({u"-I"_s, package});
     QVERIFY2(run.finished && run.exitCode == 0, qPrintable(run.standardError));
-    struct stat status {};
+    struct stat status { };
     QCOMPARE(::lstat(QFile::encodeName(m_games + u"/Game/pipe"_s).constData(), &status), 0);
     QVERIFY(S_ISREG(status.st_mode));
 }
@@ -210,8 +209,8 @@ void TestServiceInstall::reinstallMatchesFolderInAnyCase()
     const QString package = pack(source, u"upper.bvxpak"_s);
     QVERIFY(!package.isEmpty());
     QCOMPARE(runService({u"-I"_s, package}).exitCode, 0);
-    QCOMPARE(QDir(m_games).entryList(QDir::AllEntries | QDir::Hidden | QDir::NoDotAndDotDot),
-        QStringList({u"EXISTING"_s}));
+    QCOMPARE(
+        QDir(m_games).entryList(QDir::AllEntries | QDir::Hidden | QDir::NoDotAndDotDot), QStringList({u"EXISTING"_s}));
     QCOMPARE(treeListing(m_games + u"/EXISTING"_s), treeListing(source));
 }
 

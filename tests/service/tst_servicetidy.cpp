@@ -31,7 +31,7 @@ private Q_SLOTS:
 
 private:
     // Starts a process that holds an install slot; returns the slot's folder.
-    QString holdSlot(QProcess& holder);
+    QString holdSlot(QProcess& holder, bool holdGamesLock = false);
     void kill(QProcess& holder);
 
     std::unique_ptr<TestEnvironment> m_environment;
@@ -50,9 +50,12 @@ void TestServiceTidy::cleanup()
     m_environment.reset();
 }
 
-QString TestServiceTidy::holdSlot(QProcess& holder)
+QString TestServiceTidy::holdSlot(QProcess& holder, bool holdGamesLock)
 {
-    holder.start(QStringLiteral(SLOT_HOLDER), {m_games});
+    QStringList arguments {m_games};
+    if (holdGamesLock)
+        arguments.append(u"games-lock"_s);
+    holder.start(QStringLiteral(SLOT_HOLDER), arguments);
     if (!holder.waitForStarted() || !holder.waitForReadyRead(30000))
         return QString();
     return QString::fromLocal8Bit(holder.readLine()).trimmed();
@@ -92,12 +95,14 @@ void TestServiceTidy::tidyRemovesWhatAKilledInstallLeft()
     QProcess first;
     QProcess second;
     const QString firstSlot = holdSlot(first);
-    const QString secondSlot = holdSlot(second);
+    // Killed while it held the games folder lock, as during a final rename.
+    const QString secondSlot = holdSlot(second, true);
     QVERIFY(!firstSlot.isEmpty() && !secondSlot.isEmpty());
     QVERIFY(firstSlot != secondSlot);
     kill(first);
     kill(second);
     QVERIFY(QFileInfo::exists(firstSlot + u"/Half/data/part.bin"_s));
+    QVERIFY(QFileInfo::exists(m_games + u'/' + StagingNames::GamesLockFile));
     // A slot whose lock file never got written is a leftover too.
     QVERIFY(QFile::remove(secondSlot + StagingNames::LockSuffix));
 
@@ -152,18 +157,16 @@ void TestServiceTidy::commandLine_data()
     using Kind = ServiceCommand::Kind;
     QTest::newRow("install") << QStringList {u"-I"_s, u"/tmp/a b.bvxpak"_s} << int(Kind::Install)
                              << u"/tmp/a b.bvxpak"_s;
-    QTest::newRow("install lower case") << QStringList {u"-i"_s, u"x.bvxpak"_s} << int(Kind::Install)
-                                        << u"x.bvxpak"_s;
+    QTest::newRow("install lower case") << QStringList {u"-i"_s, u"x.bvxpak"_s} << int(Kind::Install) << u"x.bvxpak"_s;
     QTest::newRow("install slash") << QStringList {u"/I"_s, u"x.bvxpak"_s} << int(Kind::Install) << u"x.bvxpak"_s;
-    QTest::newRow("install quoted twice") << QStringList {u"-I"_s, u"\"x y.bvxpak\""_s} << int(Kind::Install)
-                                          << u"x y.bvxpak"_s;
+    QTest::newRow("install quoted twice")
+        << QStringList {u"-I"_s, u"\"x y.bvxpak\""_s} << int(Kind::Install) << u"x y.bvxpak"_s;
     QTest::newRow("install in pieces") << QStringList {u"-I"_s, u"My"_s, u"Game.bvxpak"_s} << int(Kind::Install)
                                        << u"My Game.bvxpak"_s;
     QTest::newRow("install empty") << QStringList {u"-I"_s, u"\"\""_s} << int(Kind::Usage) << QString();
     QTest::newRow("tidy") << QStringList {u"-U"_s} << int(Kind::Tidy) << QString();
     QTest::newRow("after launch") << QStringList {u"-r"_s} << int(Kind::AfterLaunch) << QString();
-    QTest::newRow("pack") << QStringList {u"--pack"_s, u"dir"_s, u"o.bvxpak"_s} << int(Kind::Pack)
-                          << u"o.bvxpak"_s;
+    QTest::newRow("pack") << QStringList {u"--pack"_s, u"dir"_s, u"o.bvxpak"_s} << int(Kind::Pack) << u"o.bvxpak"_s;
     QTest::newRow("long unknown") << QStringList {u"-Install"_s, u"x"_s} << int(Kind::Usage) << QString();
 }
 
