@@ -38,7 +38,7 @@ public:
             m_window->setGame(m_gameFolder);
             m_window->show();
         }
-        return m_window->update(done, total);
+        return m_window->showProgress(done, total);
     }
 
     void failed(const QString& reason) override
@@ -87,7 +87,7 @@ void ProgressWindow::setFinishing()
     QCoreApplication::processEvents();
 }
 
-bool ProgressWindow::update(qint64 done, qint64 total)
+bool ProgressWindow::showProgress(qint64 done, qint64 total)
 {
     if (m_sinceRepaint.elapsed() >= RepaintIntervalMs) {
         m_sinceRepaint.restart();

@@ -18,7 +18,7 @@ public:
     void setGame(const QString& gameFolder);
     void setFinishing();
     // Lets the window paint and answer at most every few dozen milliseconds; false once cancelled.
-    bool update(qint64 done, qint64 total);
+    bool showProgress(qint64 done, qint64 total);
     bool cancelled() const { return m_cancelled; }
 
 protected:

@@ -1,6 +1,7 @@
 #include "app/startup/CommandLine.h"
 #include "app/startup/WidgetPrompts.h"
 #include "app/startup/modMain.h"
+#include "media/WebEngineStartup.h"
 #include "store/SettingsStore.h"
 
 #include <QApplication>
@@ -15,6 +16,7 @@ int main(int argc, char* argv[])
     if (CommandLine::NeedsNoDisplay(argc, argv) && qEnvironmentVariableIsEmpty("QT_QPA_PLATFORM"))
         qputenv("QT_QPA_PLATFORM", "offscreen");
 
+    PrepareWebEngine();
     QApplication app(argc, argv);
     QApplication::setApplicationName(AppTitle());
     QApplication::setApplicationVersion(QStringLiteral(BRIMVAULT_VERSION));

@@ -4,6 +4,12 @@
 set -euo pipefail
 cd "$(dirname "$0")/.."
 
+if ! command -v node >/dev/null 2>&1 || ! command -v npm >/dev/null 2>&1; then
+    echo "Node.js and npm are missing: Flash movies will not play until Ruffle is installed" \
+        "(apt-get install nodejs npm, then tools/install-ruffle.sh)." >&2
+    exit 0
+fi
+
 ruffle=node_modules/@ruffle-rs/ruffle
 stamp=node_modules/.package-lock.json
 
@@ -15,11 +21,6 @@ fi
 
 if [ -n "$have" ] && [ "$have" = "$wanted" ] && [ -f "$stamp" ] && [ ! package-lock.json -nt "$stamp" ] \
     && [ -f "$ruffle/ruffle.js" ]; then
-    exit 0
-fi
-
-if ! command -v npm >/dev/null 2>&1; then
-    echo "npm is missing: Flash movies will not play until Ruffle is installed (apt-get install npm)." >&2
     exit 0
 fi
 

@@ -6,12 +6,12 @@
 #include "media/HostPages.h"
 #include "media/MediaHostFiles.h"
 #include "media/MediaKind.h"
+#include "media/ReclamaPicture.h"
 #include "store/CatalogueKeys.h"
 #include "support/SpecialFolders.h"
 #include "support/UserPrompt.h"
 
 #include <QAction>
-#include <QCoreApplication>
 #include <QDesktopServices>
 #include <QDir>
 #include <QImageReader>
@@ -22,7 +22,6 @@
 #include <QPointer>
 #include <QStyle>
 #include <QToolButton>
-#include <QWebEngineHistory>
 #include <QWebEngineView>
 
 namespace Brimvault {
@@ -278,7 +277,7 @@ bool frmReclama::showStillPicture(const QString& file)
         return false;
     removeHostedControls();
     m_picture = std::move(picture);
-    m_sampledColour = m_sampleColours ? surroundingColour() : m_backColour;
+    m_sampledColour = m_sampleColours ? ReclamaPicture::SurroundingColour(m_picture, m_backColour) : m_backColour;
     m_mode = ModeStillPicture;
     setCursor(Qt::PointingHandCursor);
 
@@ -308,52 +307,13 @@ void frmReclama::keyPressEvent(QKeyEvent* event)
     QWidget::keyPressEvent(event);
 }
 
-QColor frmReclama::surroundingColour() const
-{
-    const int width = m_picture.width();
-    const int height = m_picture.height();
-    const int step = width / 100;
-    if (height <= 60 || step <= 0)
-        return m_backColour;
-    qint64 red = 0, green = 0, blue = 0, count = 0;
-    for (const int y : {30, height - 31}) {
-        for (int k = 0; k < 100; ++k) {
-            const int x = 30 + k * step;
-            if (x >= width)
-                break;
-            const QColor colour = m_picture.pixelColor(x, y);
-            red += colour.red();
-            green += colour.green();
-            blue += colour.blue();
-            ++count;
-        }
-    }
-    if (count == 0)
-        return m_backColour;
-    return QColor(int(red / count), int(green / count), int(blue / count));
-}
-
 void frmReclama::paintEvent(QPaintEvent*)
 {
     QPainter painter(this);
-    if (m_mode != ModeStillPicture || m_picture.isNull()) {
+    if (m_mode == ModeStillPicture && !m_picture.isNull())
+        ReclamaPicture::PaintPicture(painter, rect(), m_picture, m_sampledColour);
+    else
         painter.fillRect(rect(), m_backColour);
-        return;
-    }
-    // The space around the picture runs from the picture's own edge colour to its half shade.
-    const QColor edge = m_sampledColour;
-    const QColor shade(edge.red() / 2, edge.green() / 2, edge.blue() / 2);
-    QLinearGradient gradient(rect().topLeft(), rect().bottomLeft());
-    gradient.setColorAt(0.0, edge);
-    gradient.setColorAt(1.0, shade);
-    painter.fillRect(rect(), gradient);
-
-    const QSize painted = m_picture.size().boundedTo(size()) == m_picture.size()
-        ? m_picture.size()
-        : m_picture.size().scaled(size(), Qt::KeepAspectRatio);
-    const QRect target(QPoint((width() - painted.width()) / 2, (height() - painted.height()) / 2), painted);
-    painter.setRenderHint(QPainter::SmoothPixmapTransform);
-    painter.drawImage(target, m_picture);
 }
 
 void frmReclama::resizeEvent(QResizeEvent* event)

@@ -63,7 +63,6 @@ private:
     void layoutControls();
     void openWithShell(const QString& target);
     void onFlashHostLoaded(bool ok);
-    QColor surroundingColour() const;
     void finishShowing(bool failed, bool maximized);
 
     int m_mode = ModeNothing;

@@ -82,8 +82,8 @@ QStringList pathsOf(const QList<Brimvault::GameEntry>& entries)
 QList<QPair<QString, QByteArray>> snapshotTree(const QString& folder)
 {
     QList<QPair<QString, QByteArray>> files;
-    QDirIterator it(folder, QDir::AllEntries | QDir::NoDotAndDotDot | QDir::Hidden | QDir::System,
-        QDirIterator::Subdirectories);
+    QDirIterator it(
+        folder, QDir::AllEntries | QDir::NoDotAndDotDot | QDir::Hidden | QDir::System, QDirIterator::Subdirectories);
     while (it.hasNext()) {
         const QString path = it.next();
         if (it.fileInfo().isDir()) {

@@ -98,8 +98,8 @@ void TestGameAdder::addFolderWalkOrder()
         = adder.AddGamesFromFolder(root, [&sunk](const GameEntry& entry) { sunk.append(entry.path); });
     // Below the root first, each folder before its sub-folders; the stop-marked folder's own files are
     // still taken, nothing below it; the root comes last.
-    const QStringList expected {root + u"/a/a.exe"_qs, root + u"/a/b/b.swf"_qs, root + u"/a/b/c/c.exe"_qs,
-        root + u"/top.exe"_qs};
+    const QStringList expected {
+        root + u"/a/a.exe"_qs, root + u"/a/b/b.swf"_qs, root + u"/a/b/c/c.exe"_qs, root + u"/top.exe"_qs};
     QCOMPARE(pathsOf(added), expected);
     QCOMPARE(sunk, expected);
     QCOMPARE(filesSection(),
@@ -111,16 +111,15 @@ void TestGameAdder::addFolderFilters()
 {
     TestEnvironment env;
     const QString root = env.path(QStringLiteral("tree/"));
-    for (const char* name : {"game.exe", "movie.SWF", "setup.exe", "Install.exe", "uninst.exe", "t.exe",
-             "readme.txt", "page.htm", "Brimvault.exe", ".hidden.exe"})
+    for (const char* name : {"game.exe", "movie.SWF", "setup.exe", "Install.exe", "uninst.exe", "t.exe", "readme.txt",
+             "page.htm", "Brimvault.exe", ".hidden.exe"})
         QVERIFY(writeFile(root + QString::fromLatin1(name)));
     ListBuilder builder(DataFolders::IconsFolder());
     builder.beginPass();
     GameAdder adder(builder);
     const QList<GameEntry> added = adder.AddGamesFromFolder(root);
     const QStringList paths = pathsOf(added);
-    QCOMPARE(QSet<QString>(paths.begin(), paths.end()),
-        QSet<QString>({root + u"game.exe"_qs, root + u"movie.SWF"_qs}));
+    QCOMPARE(QSet<QString>(paths.begin(), paths.end()), QSet<QString>({root + u"game.exe"_qs, root + u"movie.SWF"_qs}));
     QCOMPARE(setting(u"Count"_qs), u"2"_qs);
 }
 

@@ -198,8 +198,7 @@ void TestGameDiscovery::microsoftGamesFolder_data()
         << 6 << u"Program Files"_qs << u"Program Files (x86)/Microsoft Games"_qs << true;
     QTest::newRow("64-bit games seen from a 32-bit process")
         << 10 << u"Program Files (x86)"_qs << u"Program Files/Microsoft Games"_qs << true;
-    QTest::newRow("xp has the gaming zone") << 5 << u"Program Files"_qs << u"Program Files/MSN Gaming Zone"_qs
-                                            << true;
+    QTest::newRow("xp has the gaming zone") << 5 << u"Program Files"_qs << u"Program Files/MSN Gaming Zone"_qs << true;
     QTest::newRow("xp ignores microsoft games")
         << 5 << u"Program Files"_qs << u"Program Files/Microsoft Games"_qs << false;
     QTest::newRow("vista ignores the gaming zone")

@@ -40,14 +40,14 @@ void TestGameRules::tidyName_data()
     QTest::newRow("russian prefix cut") << QStringLiteral("Исполняемый файл для игры Chess") << QStringLiteral("Chess");
     QTest::newRow("prefix elsewhere kept")
         << QStringLiteral("A Исполняемый файл для игры") << QStringLiteral("A Исполняемый файл для игры");
-    QTest::newRow("prefix without blank kept") << QStringLiteral("Исполняемый файл для игры")
-                                               << QStringLiteral("Исполняемый файл для игры");
+    QTest::newRow("prefix without blank kept")
+        << QStringLiteral("Исполняемый файл для игры") << QStringLiteral("Исполняемый файл для игры");
     QTest::newRow("40 without blanks") << QStringLiteral("ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmn")
                                        << QStringLiteral("ABCDEFGHIJKL MNOPQRSTUVWX YZabcd...");
     QTest::newRow("exactly 12 unbroken") << QStringLiteral("ABCDEFGHIJKL") << QStringLiteral("ABCDEFGHIJKL");
     QTest::newRow("13 broken after 12") << QStringLiteral("ABCDEFGHIJKLM") << QStringLiteral("ABCDEFGHIJKL M");
-    QTest::newRow("24 letters, 25 after break, stays") << QStringLiteral("ABCDEFGHIJKLMNOPQRSTUVWX")
-                                          << QStringLiteral("ABCDEFGHIJKL MNOPQRSTUVWX");
+    QTest::newRow("24 letters, 25 after break, stays")
+        << QStringLiteral("ABCDEFGHIJKLMNOPQRSTUVWX") << QStringLiteral("ABCDEFGHIJKL MNOPQRSTUVWX");
     QTest::newRow("25 letters get a second blank after the 25th character")
         << QStringLiteral("ABCDEFGHIJKLMNOPQRSTUVWXY") << QStringLiteral("ABCDEFGHIJKL MNOPQRSTUVWX Y");
     QTest::newRow("26 letters get a second blank after the 25th character")

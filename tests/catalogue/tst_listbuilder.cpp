@@ -49,9 +49,10 @@ void TestListBuilder::caption_data()
     const QString name = QStringLiteral("Name");
     const QString nameEng = QStringLiteral("Name_ENG");
     QTest::newRow("user name beats info file and zone table")
-        << u"hrtzzm.exe"_qs << QString() << u"My Hearts"_qs << Records {{name, QStringLiteral("Info Hearts")}} << u"My Hearts"_qs;
-    QTest::newRow("info file beats zone table")
-        << u"hrtzzm.exe"_qs << QString() << QString() << Records {{name, QStringLiteral("Info Hearts")}} << u"Info Hearts"_qs;
+        << u"hrtzzm.exe"_qs << QString() << u"My Hearts"_qs << Records {{name, QStringLiteral("Info Hearts")}}
+        << u"My Hearts"_qs;
+    QTest::newRow("info file beats zone table") << u"hrtzzm.exe"_qs << QString() << QString()
+                                                << Records {{name, QStringLiteral("Info Hearts")}} << u"Info Hearts"_qs;
     QTest::newRow("info file in the current language")
         << u"game.exe"_qs << QString() << QString()
         << Records {{name, QStringLiteral("Any Language")}, {nameEng, QStringLiteral("  English Name  ")}}
@@ -70,16 +71,17 @@ void TestListBuilder::caption_data()
     QTest::newRow("version description with russian prefix")
         << u"chess.exe"_qs << u"catalogue/ru_prefix.exe"_qs << QString() << noInfo << u"Chess"_qs;
     QTest::newRow("long version description trimmed, cut and broken")
-        << u"long.exe"_qs << u"catalogue/long_desc.exe"_qs << QString() << noInfo << u"SuperMegaUlt raExtremeHyp erDelu..."_qs;
-    QTest::newRow("version without description") << u"nodesc.exe"_qs << u"pe/ver_nodesc64.exe"_qs << QString() << noInfo
-                                                 << u"nodesc"_qs;
-    QTest::newRow("executable without resources") << u"Arcade.exe"_qs << u"pe/nores64.exe"_qs << QString() << noInfo
-                                                  << u"Arcade"_qs;
+        << u"long.exe"_qs << u"catalogue/long_desc.exe"_qs << QString() << noInfo
+        << u"SuperMegaUlt raExtremeHyp erDelu..."_qs;
+    QTest::newRow("version without description")
+        << u"nodesc.exe"_qs << u"pe/ver_nodesc64.exe"_qs << QString() << noInfo << u"nodesc"_qs;
+    QTest::newRow("executable without resources")
+        << u"Arcade.exe"_qs << u"pe/nores64.exe"_qs << QString() << noInfo << u"Arcade"_qs;
     QTest::newRow("plain file") << u"Some Game.exe"_qs << QString() << QString() << noInfo << u"Some Game"_qs;
     QTest::newRow("long file title broken")
         << u"VeryLongGameTitle.exe"_qs << QString() << QString() << noInfo << u"VeryLongGame Title"_qs;
-    QTest::newRow("user name is tidied too") << u"g.exe"_qs << QString() << u"Исполняемый файл для игры Шашки"_qs << noInfo
-                                             << u"Шашки"_qs;
+    QTest::newRow("user name is tidied too")
+        << u"g.exe"_qs << QString() << u"Исполняемый файл для игры Шашки"_qs << noInfo << u"Шашки"_qs;
 }
 
 void TestListBuilder::caption()
@@ -95,8 +97,8 @@ void TestListBuilder::caption()
     if (fixture.isEmpty()) {
         QVERIFY(writeFile(path));
     } else {
-        const QString source = fixture.startsWith(QStringLiteral("pe/")) ? peFixture(fixture.mid(3))
-                                                                           : catalogueFixture(fixture.mid(10));
+        const QString source
+            = fixture.startsWith(QStringLiteral("pe/")) ? peFixture(fixture.mid(3)) : catalogueFixture(fixture.mid(10));
         if (source.isEmpty())
             QSKIP("PE fixtures were not built");
         QVERIFY(copyFile(source, path));
@@ -139,7 +141,8 @@ void TestListBuilder::icon_data()
     QTest::addColumn<QString>("expected");
     QTest::newRow("own icon") << u"a.exe"_qs << u"valid"_qs << u""_qs << u"file"_qs;
     QTest::newRow("own icon wins over cache") << u"a.exe"_qs << u"valid"_qs << u"valid"_qs << u"file"_qs;
-    QTest::newRow("corrupt own icon queues even with cache") << u"a.exe"_qs << u"corrupt"_qs << u"valid"_qs << u"queued"_qs;
+    QTest::newRow("corrupt own icon queues even with cache")
+        << u"a.exe"_qs << u"corrupt"_qs << u"valid"_qs << u"queued"_qs;
     QTest::newRow("cache") << u"a.exe"_qs << u""_qs << u"valid"_qs << u"cache"_qs;
     QTest::newRow("corrupt cache") << u"a.exe"_qs << u""_qs << u"corrupt"_qs << u"queued"_qs;
     QTest::newRow("nothing") << u"a.exe"_qs << u""_qs << u""_qs << u"queued"_qs;

@@ -86,7 +86,10 @@ void TestListCommand::buildLibrary()
     QVERIFY(writeFile(added));
     QVERIFY(SaveSetting(AppTitle(), u"Files"_qs, u"File3"_qs, added));
     QVERIFY(SaveSetting(AppTitle(), u"Files"_qs, u"File4"_qs, m_gamesFolder + u"Own/own.exe"_qs));
+    QVERIFY(SaveSetting(AppTitle(), u"Files"_qs, u"File5"_qs, m_env->path(u"mine/hrtzzm.exe"_qs)));
     QVERIFY(SaveSetting(AppTitle(), u"FilesNames"_qs, u"FileName3"_qs, u"Renamed"_qs));
+    QVERIFY(writeFile(m_env->path(u"program/Brimvault_Test.lng"_qs),
+        QByteArrayLiteral("#language=Testish\n#charset=204\n@1250=Online Test\n@2030=Test Chervi\n")));
     QVERIFY(SaveSetting(AppTitle(), u"LocaleSettings"_qs, u"LngFileName"_qs, u"Brimvault_Test.lng"_qs));
     QVERIFY(SaveSetting(AppTitle(), u"LocaleSettings"_qs, u"LngNik"_qs, u"TST"_qs));
 }
@@ -113,11 +116,12 @@ void TestListCommand::textAgreesWithTheLibrary()
 
     QStringList lines = text.split(u'\n');
     QCOMPARE(lines.takeLast(), QString());
-    QCOMPARE(lines.size(), 7);
-    QCOMPARE(lines.first(), u"Online games\thttp://127.0.0.1:9/online-games-catalog.asp"_qs);
+    QCOMPARE(lines.size(), 8);
+    QCOMPARE(lines.first(), u"Online Test\thttp://127.0.0.1:9/online-games-catalog.asp"_qs);
     QVERIFY(lines.contains(u"Marble In Test Language\t"_qs + m_gamesFolder + u"Marble/marble.exe"_qs));
     QCOMPARE(lines.at(5), u"sol\t"_qs + m_env->path(u"windows/sol.exe"_qs));
     QCOMPARE(lines.at(6), u"Renamed\t"_qs + m_env->path(u"mine/Added Game.exe"_qs));
+    QCOMPARE(lines.at(7), u"Test Chervi\t"_qs + m_env->path(u"mine/hrtzzm.exe"_qs));
 }
 
 void TestListCommand::jsonNamesTheIconSources()

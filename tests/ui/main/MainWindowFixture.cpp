@@ -13,7 +13,9 @@
 #include <QFile>
 #include <QFileInfo>
 #include <QImage>
+#include <QDialog>
 #include <QLibrary>
+#include <QPointer>
 #include <QTimer>
 #include <QWidget>
 
@@ -127,8 +129,15 @@ void WhenModalShows(const std::function<void(QWidget*)>& act)
             return;
         poll->stop();
         poll->deleteLater();
-        if (modal)
-            act(modal);
+        if (!modal)
+            return;
+        QPointer<QWidget> shown(modal);
+        act(modal);
+        // A dialog the test failed to close must not hang the run.
+        QTimer::singleShot(3000, qApp, [shown] {
+            if (auto* dialog = qobject_cast<QDialog*>(shown.data()); dialog && dialog->isVisible())
+                dialog->reject();
+        });
     });
     poll->start();
 }

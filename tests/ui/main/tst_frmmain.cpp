@@ -244,7 +244,7 @@ private Q_SLOTS:
         for (const char* name : {"Color Lines", "Mahjong Garden", "Sudoku Master", "Chess 3D", "Klondike Solitaire",
                  "Aquarium", "Street Racer", "Jewel Match", "Air Hockey", "Happy Farm"}) {
             const int index = indexOfCaption(list, QString::fromLatin1(name));
-            QVERIFY2(index > 0, name);
+            QVERIFY2(index > 0, qPrintable(captions.join(u'|')));
             QVERIFY2(!list->imgN(index).Picture().isNull(), name);
         }
         const int movie = indexOfCaption(list, QStringLiteral("Bubble Shooter"));

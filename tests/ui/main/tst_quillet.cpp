@@ -155,7 +155,8 @@ private Q_SLOTS:
             QVERIFY(dialog);
             title = dialog->windowTitle();
             QVERIFY(dialog->testOption(QFileDialog::ShowDirsOnly));
-            dialog->selectFile(folder + u'/');
+            dialog->setDirectory(m_env->path(QStringLiteral("personal")));
+            dialog->selectFile(folder);
             static_cast<QDialog*>(dialog)->accept();
         });
         CreatedObject created;
