@@ -85,7 +85,8 @@ void tst_Timers::watcherPollsEveryThreeSeconds()
         SaveSetting(AppTitle(), QStringLiteral("COMMANDS"), QStringLiteral("newgameinstalled"), QStringLiteral("1")));
 
     QTRY_COMPARE_WITH_TIMEOUT(rebuilds.count(), 1, 6000);
-    QVERIFY(clock.elapsed() >= ServiceSignalWatcher::PollIntervalMs - 100);
+    // Coarse timers may tick up to 5% early.
+    QVERIFY(clock.elapsed() >= ServiceSignalWatcher::PollIntervalMs * 9 / 10);
     QCOMPARE(signalValue(), QStringLiteral("0"));
 
     watcher.poll();

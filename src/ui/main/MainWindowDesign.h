@@ -12,9 +12,10 @@ class QSize;
 namespace Brimvault::MainWindowDesign {
 
 inline constexpr QRect FormTwips(0, 0, 11400, 8280);
-inline constexpr QRect Label3Twips(240, 120, 5700, 660);
-inline constexpr QRect Label2Twips(270, 150, 5700, 660);
-inline constexpr QRect Label4Twips(270, 810, 7200, 300);
+inline constexpr QRect EmblemTwips(195, 150, 840, 840);
+inline constexpr QRect Label3Twips(1140, 120, 5700, 660);
+inline constexpr QRect Label2Twips(1170, 150, 5700, 660);
+inline constexpr QRect Label4Twips(1170, 810, 7200, 300);
 inline constexpr QRect ImgActionsTwips(9000, 330, 480, 480);
 inline constexpr QRect LabActionsTwips(9570, 330, 1650, 480);
 inline constexpr QRect HiddenImageTwips(0, 0, 480, 480);

@@ -251,6 +251,10 @@ void frmMain::paintEvent(QPaintEvent*)
     painter.fillRect(QRect(0, 0, width(), bandBottom), band);
     painter.setPen(MainWindowDesign::BandEdgeColor());
     painter.drawLine(0, bandBottom, width(), bandBottom);
+    // The emblem keeps its designed pixels like the title beside it.
+    const QRect emblem = FormScaling::TwipsToPixels(MainWindowDesign::EmblemTwips, {});
+    if (emblem.bottom() < bandBottom)
+        painter.drawPixmap(emblem, windowIcon().pixmap(emblem.size(), devicePixelRatioF()));
 }
 
 } // namespace Brimvault

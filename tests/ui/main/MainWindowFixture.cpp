@@ -4,7 +4,9 @@
 #include "TestEnvironment.h"
 #include "app/ComponentObjects.h"
 #include "catalogue/IconCacheKey.h"
+#include "store/InfoFiles.h"
 #include "store/SettingsStore.h"
+#include "store/clsFileBag.h"
 #include "support/ProgramFolder.h"
 
 #include <QApplication>
@@ -69,25 +71,35 @@ bool WriteIconFile(const QString& path, const QColor& color, QChar letter)
     return makeTestIcon(color, letter).toImage().convertToFormat(QImage::Format_ARGB32).save(path, "ICO");
 }
 
+bool WriteGameInfo(const QString& gamePath, const QString& name, const QString& russianName)
+{
+    Brimvault::clsFileBag bag;
+    bag.SetCurrentFileName(Brimvault::InfoFiles::GameInfoFileName(gamePath));
+    bag.SetRecord(Brimvault::clsFileBag::MakeKey(QStringLiteral("Name")), name);
+    bag.SetRecord(Brimvault::clsFileBag::MakeKey(QStringLiteral("Name_RUSSIAN")), russianName);
+    return bag.SaveFile();
+}
+
 SampleLibrary BuildSampleLibrary(const TestEnvironment& environment)
 {
     struct Installed {
         const char* folder;
         const char* title;
+        const char* name;
+        const char* russianName;
         QColor color;
         char letter;
     };
-    // Titles of the publisher's own games, so that their names follow the language.
     const Installed games[] = {
-        {"Lines", "lines", QColor(220, 60, 60), 'L'},
-        {"Mahjong", "mahjong", QColor(40, 150, 90), 'M'},
-        {"Sudoku", "sudoku", QColor(70, 90, 200), 'S'},
-        {"Chess 3D", "chess3d", QColor(60, 60, 70), 'C'},
-        {"Klondike", "klondike", QColor(200, 40, 120), 'K'},
-        {"Aquarium", "aquarium", QColor(30, 160, 200), 'A'},
-        {"Street Racer", "streetracer", QColor(240, 150, 20), 'R'},
-        {"Jewel Match", "jewelmatch", QColor(150, 60, 200), 'J'},
-        {"Air Hockey", "airhockey", QColor(20, 120, 160), 'H'},
+        {"Lines", "lines", "Color Lines", "Цветные линии", QColor(220, 60, 60), 'L'},
+        {"Mahjong", "mahjong", "Mahjong Garden", "Сад маджонга", QColor(40, 150, 90), 'M'},
+        {"Sudoku", "sudoku", "Sudoku Master", "Мастер судоку", QColor(70, 90, 200), 'S'},
+        {"Chess 3D", "chess3d", "Chess 3D", "Шахматы 3D", QColor(60, 60, 70), 'C'},
+        {"Klondike", "klondike", "Klondike Solitaire", "Пасьянс «Косынка»", QColor(200, 40, 120), 'K'},
+        {"Aquarium", "aquarium", "Aquarium", "Аквариум", QColor(30, 160, 200), 'A'},
+        {"Street Racer", "streetracer", "Street Racer", "Уличные гонки", QColor(240, 150, 20), 'R'},
+        {"Jewel Match", "jewelmatch", "Jewel Match", "Самоцветы", QColor(150, 60, 200), 'J'},
+        {"Air Hockey", "airhockey", "Air Hockey", "Аэрохоккей", QColor(20, 120, 160), 'H'},
     };
     SampleLibrary library;
     const QString gamesFolder = environment.path(QStringLiteral("commonappdata/Brimvault/"));
@@ -95,6 +107,7 @@ SampleLibrary BuildSampleLibrary(const TestEnvironment& environment)
         const QString folder = gamesFolder + QString::fromLatin1(game.folder) + u'/';
         const QString exe = folder + QString::fromLatin1(game.title) + QStringLiteral(".exe");
         WriteFile(exe);
+        WriteGameInfo(exe, QString::fromUtf8(game.name), QString::fromUtf8(game.russianName));
         WriteIconFile(folder + QString::fromLatin1(game.title) + QStringLiteral(".ico"), game.color,
             QChar::fromLatin1(game.letter));
         library.installed.append(exe);
@@ -103,10 +116,12 @@ SampleLibrary BuildSampleLibrary(const TestEnvironment& environment)
     WriteFile(library.noIconGame);
     library.cachedGame = gamesFolder + QStringLiteral("Happy Farm/happyfarm.exe");
     WriteFile(library.cachedGame);
+    WriteGameInfo(library.cachedGame, QStringLiteral("Happy Farm"), QString::fromUtf8("Весёлая ферма"));
     WriteIconFile(Brimvault::IconCacheFile(gamesFolder + QStringLiteral("Icons/"), library.cachedGame),
         QColor(110, 180, 40), u'F');
     library.flashMovie = gamesFolder + QStringLiteral("Bubbles/bubbles.swf");
     WriteFile(library.flashMovie, QByteArrayLiteral("FWS"));
+    WriteGameInfo(library.flashMovie, QStringLiteral("Bubble Shooter"), QString::fromUtf8("Стрелок шариками"));
 
     library.addedGame = environment.path(QStringLiteral("personal/Puzzles/puzzle.exe"));
     WriteFile(library.addedGame);

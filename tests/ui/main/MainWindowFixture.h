@@ -37,6 +37,9 @@ bool WriteIconFile(const QString& path, const QColor& color, QChar letter);
 // Writes a file with the given bytes, creating its folders.
 bool WriteFile(const QString& path, const QByteArray& bytes = QByteArrayLiteral("MZ not a real program"));
 
+// The game's information file with its name in English and in Russian, as the service installs it.
+bool WriteGameInfo(const QString& gamePath, const QString& name, const QString& russianName);
+
 // A library as a user has it: installed games in the games folder with their icons beside them, one without
 // an icon, a Flash movie, one whose icon is already cached, and one game added by hand with a name of the
 // user's. Returns the paths of the installed files.

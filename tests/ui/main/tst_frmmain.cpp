@@ -252,7 +252,7 @@ private Q_SLOTS:
         QVERIFY(samePicture(list->imgN(movie).Picture(), window->imgSWF()->Picture()));
 
         // The game without an icon waits for the icon cache builder, which gives it the no-icon picture.
-        const int snake = indexOfCaption(list, QStringLiteral("Snake"));
+        const int snake = indexOfCaption(list, QStringLiteral("snake"));
         QVERIFY(snake > 0);
         waitForIcons(window.get());
         QVERIFY(samePicture(list->imgN(snake).Picture(), window->imgNoIcon()->Picture()));
@@ -359,8 +359,12 @@ private Q_SLOTS:
 
         QMimeData mime;
         mime.setUrls({QUrl::fromLocalFile(first), QUrl::fromLocalFile(movie), QUrl::fromLocalFile(second)});
+        QDragEnterEvent enter(QPoint(40, 40), Qt::CopyAction, &mime, Qt::LeftButton, Qt::NoModifier);
+        QApplication::sendEvent(list, &enter);
+        QVERIFY(enter.isAccepted());
         QDropEvent drop(QPointF(40, 40), Qt::CopyAction, &mime, Qt::LeftButton, Qt::NoModifier);
         QApplication::sendEvent(list, &drop);
+        QVERIFY(drop.isAccepted());
 
         QCOMPARE(setting(QStringLiteral("Files"), QStringLiteral("Count")), QStringLiteral("2"));
         QCOMPARE(setting(QStringLiteral("Files"), QStringLiteral("File1")), first);
@@ -406,7 +410,9 @@ private Q_SLOTS:
         QCOMPARE(window->labActions()->text(), QString::fromUtf8("Действия"));
         QCOMPARE(window->findChild<QAction*>(QStringLiteral("mnuAbout"))->text(), QString::fromUtf8("О программе..."));
         QCOMPARE(window->ListView1()->labN(0).text(), QString::fromUtf8("Онлайн-игры"));
+        // Names from the games' information files, and the publisher's own names by file title.
         QVERIFY(indexOfCaption(window->ListView1(), QString::fromUtf8("Цветные линии")) > 0);
+        QVERIFY(indexOfCaption(window->ListView1(), QString::fromUtf8("Змейка")) > 0);
         QCOMPARE(indexOfCaption(window->ListView1(), QStringLiteral("Color Lines")), -1);
 
         choose(0);
@@ -414,6 +420,7 @@ private Q_SLOTS:
             QStringLiteral("English (Default)"));
         QCOMPARE(window->labActions()->text(), QStringLiteral("Actions"));
         QVERIFY(indexOfCaption(window->ListView1(), QStringLiteral("Color Lines")) > 0);
+        QVERIFY(indexOfCaption(window->ListView1(), QStringLiteral("snake")) > 0);
         QVERIFY(m_prompts.isEmpty());
     }
 
