@@ -84,6 +84,10 @@ InstallSlot::~InstallSlot()
 std::unique_ptr<InstallSlot> InstallSlot::create(const QString& gamesFolder)
 {
     const QString staging = StagingFolderPath(gamesFolder);
+    // A link in its place could lead the unpacking anywhere.
+    const QFileInfo existing(staging);
+    if (existing.isSymLink() || (existing.exists() && !existing.isDir()))
+        return nullptr;
     if (!QDir().mkpath(staging) || !writeStopMark(staging))
         return nullptr;
     for (int attempt = 0; attempt < 16; ++attempt) {
@@ -143,7 +147,7 @@ int TidyStagingArea(const QString& gamesFolder)
     if (!dir.exists() && !lockLeftBehind)
         return 0;
     GamesFolderLock gamesLock(gamesFolder, TidyLockTimeoutMs);
-    if (!gamesLock.isLocked() || !dir.exists())
+    if (!gamesLock.isLocked() || !dir.exists() || QFileInfo(staging).isSymLink())
         return 0;
     int removed = 0;
     const QStringList names = dir.entryList(

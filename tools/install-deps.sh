@@ -8,6 +8,7 @@ packages=(
     libarchive-dev xvfb xauth unzip
     mingw-w64 icoutils python3-pefile
     clang libclang-rt-14-dev clang-format
+    desktop-file-utils appstream librsvg2-bin
 )
 
 missing=()

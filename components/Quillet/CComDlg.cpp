@@ -51,8 +51,8 @@ QStringList CComDlg::NameFilters(const QString& sFilter)
     return filters;
 }
 
-QString CComDlg::ShowOpenSaveDialog(QObject* frmOwner, const QString& sTitle, const QString& sFilter,
-    int nFilterIndex, const QString& sInitDir, int lFlags, bool bSave)
+QString CComDlg::ShowOpenSaveDialog(QObject* frmOwner, const QString& sTitle, const QString& sFilter, int nFilterIndex,
+    const QString& sInitDir, int lFlags, bool bSave)
 {
     if (const std::optional<QString> answer = unattendedAnswer())
         return *answer;

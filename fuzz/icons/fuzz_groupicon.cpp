@@ -23,7 +23,7 @@ extern "C" int LLVMFuzzerTestOneInput(const uint8_t* data, size_t size)
     try {
         cResources resources;
         resources.setFile(path);
-        const int types = resources.GetResourceTypes();
+        const int types = qMin(resources.GetResourceTypes(), 64);
         for (int t = 1; t <= types; ++t) {
             const int count = resources.GetResourceNames(t);
             for (int n = 1; n <= count; ++n)

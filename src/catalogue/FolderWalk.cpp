@@ -1,6 +1,7 @@
 #include "catalogue/FolderWalk.h"
 
 #include "catalogue/CatalogueLocations.h"
+#include "store/CatalogueKeys.h"
 #include "store/InfoFiles.h"
 
 #include <QPair>
@@ -43,32 +44,40 @@ struct WalkState {
     QSet<QPair<quint64, quint64>> visited;
 };
 
-bool firstVisit(const QString& folder, WalkState& state)
+bool firstVisit(const Listing& listing, WalkState& state)
+{
+    if (!listing.identity)
+        return true;
+    if (state.visited.contains(*listing.identity))
+        return false;
+    state.visited.insert(*listing.identity);
+    return true;
+}
+
+// The stop mark is looked for in the listing, so that folders without one cost no extra file look-up.
+bool isStopFolder(const QString& folder, const Listing& listing)
 {
 #ifdef Q_OS_WIN
-    Q_UNUSED(folder);
-    Q_UNUSED(state);
-    return true;
+    constexpr Qt::CaseSensitivity nameCase = Qt::CaseInsensitive;
 #else
-    struct stat status { };
-    if (::stat(QFile::encodeName(FileSystemPath(folder)).constData(), &status) != 0)
-        return true;
-    const QPair<quint64, quint64> identity(quint64(status.st_dev), quint64(status.st_ino));
-    if (state.visited.contains(identity))
-        return false;
-    state.visited.insert(identity);
-    return true;
+    constexpr Qt::CaseSensitivity nameCase = Qt::CaseSensitive;
 #endif
+    return listing.files.contains(CatalogueKeys::DirInfoFileName, nameCase) && InfoFiles::IsStopFolder(folder);
 }
 
 // ownIndex is the folder's place in the result, -1 for the root, which the caller keeps itself.
 void collect(const QString& folder, qsizetype ownIndex, int depth, WalkState& state)
 {
-    if (depth > MaximumDepth || InfoFiles::IsStopFolder(folder) || !firstVisit(folder, state))
+    if (depth > MaximumDepth)
         return;
     Listing listing = ListFolder(folder);
+    if (!firstVisit(listing, state))
+        return;
+    const bool stop = isStopFolder(folder, listing);
     if (ownIndex >= 0)
         state.result[ownIndex].files = std::move(listing.files);
+    if (stop)
+        return;
     const QChar separator = separatorOf(folder);
     const qsizetype first = state.result.size();
     for (const QString& name : std::as_const(listing.folders))
@@ -117,6 +126,9 @@ Listing ListFolder(const QString& folder)
         else if (isFile)
             listing.files.append(QFile::decodeName(entry->d_name));
     }
+    struct stat status { };
+    if (::fstat(::dirfd(dir), &status) == 0)
+        listing.identity = qMakePair(quint64(status.st_dev), quint64(status.st_ino));
     ::closedir(dir);
 #endif
     return listing;

@@ -1,6 +1,7 @@
 #pragma once
 
 #include <QList>
+#include <QPair>
 #include <QString>
 #include <QStringList>
 
@@ -15,6 +16,7 @@ namespace Brimvault::FolderWalk {
 struct Listing {
     QStringList files; // plain files
     QStringList folders; // sub-folder names, without separator
+    std::optional<QPair<quint64, quint64>> identity; // device and node, where the system has them
 };
 
 // Empty when the folder cannot be read.

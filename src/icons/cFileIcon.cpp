@@ -88,11 +88,8 @@ bool cFileIcon::LoadIcon(const QString& sFileName)
     reset(sFileName);
     m_lastLoadMessage.clear();
     QFile file(sFileName);
-    if (!file.open(QIODevice::ReadOnly)) {
-        m_lastLoadMessage = file.errorString();
-        return false;
-    }
-    const QByteArray header = file.read(IconHeaderSize);
+    // A file that cannot be opened reads as nothing: the zeroed header then fails the type test.
+    const QByteArray header = file.open(QIODevice::ReadOnly) ? file.read(IconHeaderSize) : QByteArray();
     const ByteReader headerReader {QByteArrayView(header)};
     m_idReserved = headerReader.u16(0).value_or(0);
     m_idType = headerReader.u16(2).value_or(0);

@@ -122,13 +122,13 @@ QStringList realPeFiles(int maxFiles)
     return files;
 }
 
-QByteArray buildIconFile(const QList<ImageSpec>& images)
+QByteArray buildIconFile(const QList<FakeImage>& images)
 {
     QByteArray out(6, '\0');
     qToLittleEndian<quint16>(1, out.data() + 2);
     qToLittleEndian<quint16>(quint16(images.size()), out.data() + 4);
     quint32 offset = 6 + 16 * quint32(images.size());
-    for (const ImageSpec& image : images) {
+    for (const FakeImage& image : images) {
         QByteArray entry(16, '\0');
         entry[0] = char(image.width);
         entry[1] = char(image.height);
@@ -140,7 +140,7 @@ QByteArray buildIconFile(const QList<ImageSpec>& images)
         offset += quint32(image.bytes.size());
         out.append(entry);
     }
-    for (const ImageSpec& image : images)
+    for (const FakeImage& image : images)
         out.append(image.bytes);
     return out;
 }

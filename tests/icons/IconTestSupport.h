@@ -30,7 +30,7 @@ QByteArray meaningfulIconBytes(const QByteArray& iconFile);
 QStringList realPeFiles(int maxFiles);
 
 // A small icon file assembled in memory: entries (width, height, colours, bit count) with the given images.
-struct ImageSpec {
+struct FakeImage {
     quint8 width;
     quint8 height;
     quint8 colours;
@@ -38,7 +38,7 @@ struct ImageSpec {
     quint16 bitCount;
     QByteArray bytes;
 };
-QByteArray buildIconFile(const QList<ImageSpec>& images);
+QByteArray buildIconFile(const QList<FakeImage>& images);
 // A bottom-up icon bitmap: 40-byte header, palette, colour bits and (optionally) the AND mask, all zero.
 QByteArray blankBitmap(int width, int height, int bitCount, bool withMask = true);
 

@@ -100,6 +100,7 @@ private Q_SLOTS:
         cFileIcon icon;
         QVERIFY(!icon.LoadIcon(m_env.path(QStringLiteral("nowhere/none.ico"))));
         QCOMPARE(icon.ImageCount(), 0);
+        QCOMPARE(icon.lastLoadMessage(), QStringLiteral("File is not icon type (idType <> IMAGE_ICON)"));
     }
 
     void packedFileRoundTripsByteForByte_data()

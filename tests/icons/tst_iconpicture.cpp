@@ -73,11 +73,11 @@ private Q_SLOTS:
         QFETCH(QList<QList<int>>, images);
         QFETCH(int, depth);
         QFETCH(int, best);
-        QList<IconTest::ImageSpec> specs;
+        QList<IconTest::FakeImage> fakeImages;
         for (const QList<int>& image : images)
-            specs.append({quint8(image.at(0)), quint8(image.at(0)), quint8(image.at(1)), 1, quint16(image.at(2)),
+            fakeImages.append({quint8(image.at(0)), quint8(image.at(0)), quint8(image.at(1)), 1, quint16(image.at(2)),
                 blankBitmap(4, 4, 4)});
-        const cFileIcon icon = load(buildIconFile(specs));
+        const cFileIcon icon = load(buildIconFile(fakeImages));
         QCOMPARE(icon.bestIconIndex(depth), best);
     }
 

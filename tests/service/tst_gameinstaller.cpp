@@ -27,6 +27,7 @@ private Q_SLOTS:
     void cancelLeavesGamesFolderAsItWas();
     void refusalDoesNotCreateGamesFolder();
     void gameFolderInTheWay();
+    void stagingLinkIsNotFollowed();
 
 private:
     QString packGame(const QString& name, qsizetype dataBytes);
@@ -139,6 +140,21 @@ void TestGameInstaller::gameFolderInTheWay()
     const InstallResult result = InstallPackage(package);
     QVERIFY2(result.problem.contains(u"not a game folder"), qPrintable(result.problem));
     QCOMPARE(treeListing(m_games), before);
+}
+
+void TestGameInstaller::stagingLinkIsNotFollowed()
+{
+    const QString elsewhere = m_environment->path(u"elsewhere"_s);
+    QVERIFY(QDir().mkpath(elsewhere));
+    QVERIFY(QDir().mkpath(m_games));
+    QVERIFY(QFile::link(elsewhere, StagingFolderPath(m_games)));
+    const QString package = packGame(u"Linked"_s, 1000);
+    QVERIFY(!package.isEmpty());
+    const QStringList before = treeListing(m_environment->root());
+
+    const InstallResult result = InstallPackage(package);
+    QVERIFY(!result.succeeded());
+    QCOMPARE(treeListing(m_environment->root()), before);
 }
 
 QTEST_GUILESS_MAIN(TestGameInstaller)

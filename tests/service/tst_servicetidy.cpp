@@ -26,6 +26,7 @@ private Q_SLOTS:
     void tidyRemovesWhatAKilledInstallLeft();
     void tidyKeepsRunningInstall();
     void tidyWithoutGamesFolder();
+    void tidyDoesNotFollowStagingLink();
     void commandLine_data();
     void commandLine();
 
@@ -145,6 +146,16 @@ void TestServiceTidy::tidyWithoutGamesFolder()
         QCOMPARE(run.exitCode, 0);
         QCOMPARE(run.standardError, QString());
     }
+    QCOMPARE(treeListing(m_environment->root()), before);
+}
+
+void TestServiceTidy::tidyDoesNotFollowStagingLink()
+{
+    const QString elsewhere = m_environment->path(u"elsewhere"_s);
+    QVERIFY(writeFile(elsewhere + u"/install-1-a/keep.txt"_s, "not ours"));
+    QVERIFY(QFile::link(elsewhere, StagingFolderPath(m_games)));
+    const QStringList before = treeListing(m_environment->root());
+    QCOMPARE(runService({u"-U"_s}).exitCode, 0);
     QCOMPARE(treeListing(m_environment->root()), before);
 }
 

@@ -44,8 +44,8 @@ int TwipsToPixelsY(double twips, TwipsPerPixel screen)
 
 QRect TwipsToPixels(const QRect& twips, TwipsPerPixel screen)
 {
-    return {TwipsToPixelsX(twips.x(), screen), TwipsToPixelsY(twips.y(), screen),
-        TwipsToPixelsX(twips.width(), screen), TwipsToPixelsY(twips.height(), screen)};
+    return {TwipsToPixelsX(twips.x(), screen), TwipsToPixelsY(twips.y(), screen), TwipsToPixelsX(twips.width(), screen),
+        TwipsToPixelsY(twips.height(), screen)};
 }
 
 Factors ScreenFactors(TwipsPerPixel screen)

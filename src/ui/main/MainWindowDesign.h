@@ -17,14 +17,16 @@ inline constexpr QRect Label3Twips(1140, 120, 5700, 660);
 inline constexpr QRect Label2Twips(1170, 150, 5700, 660);
 inline constexpr QRect Label4Twips(1170, 810, 7200, 300);
 inline constexpr QRect ImgActionsTwips(9000, 330, 480, 480);
-inline constexpr QRect LabActionsTwips(9570, 330, 1650, 480);
+inline constexpr QRect LabActionsTwips(9570, 330, 1500, 480);
 inline constexpr QRect HiddenImageTwips(0, 0, 480, 480);
 inline constexpr QRect ListViewTwips(200, 1260, 11140, 6960);
 
 inline constexpr qreal TitlePointSize = 22;
 inline constexpr qreal CopyrightPointSize = 9.5;
 inline constexpr qreal ActionsPointSize = 11;
+inline constexpr qreal CaptionPointSize = 8;
 inline constexpr int ActionsImageSize = 32;
+inline constexpr int ActionsGapPixels = 6;
 
 // The list's margins: left 200, top 1260, and 60 twips right and below (the width and height lose 260 and
 // 1320 twips of the client area).

@@ -56,6 +56,7 @@ frmMain::frmMain(QWidget* parent)
     modLocalizer::ApplyLanguage(this, true);
     FormScaling::ScaleForm(this, FormScaling::ScreenFactors(FormScaling::ScreenTwipsPerPixel(this)));
     m_actionsRightMargin = width() - m_labActions->geometry().right();
+    keepActionsButtonAtRightEdge();
     QuilletCalls::CenterForm(this);
 }
 
@@ -96,8 +97,7 @@ void frmMain::createControls()
     actionsFont.setPointSizeF(MainWindowDesign::ActionsPointSize);
     actionsFont.setBold(true);
     m_labActions->setFont(actionsFont);
-    m_labActions->setStyleSheet(
-        QStringLiteral("QLabel { color: white; } QLabel:hover { color: rgb(255, 214, 120); }"));
+    m_labActions->setStyleSheet(QStringLiteral("QLabel { color: white; } QLabel:hover { color: rgb(255, 214, 120); }"));
     m_labActions->setAlignment(Qt::AlignLeft | Qt::AlignVCenter);
     connect(m_imgActions, &ClickLabel::Click, this, &frmMain::ShowActionsMenu);
     connect(m_labActions, &ClickLabel::Click, this, &frmMain::ShowActionsMenu);
@@ -117,6 +117,10 @@ void frmMain::createControls()
     m_listView = new SimpleListView(this);
     m_listView->setObjectName(QStringLiteral("ListView1"));
     m_listView->SetOLEDropMode(1);
+    // Captions wrap at 64 pixels: a compact font keeps most names whole.
+    QFont captionFont = font();
+    captionFont.setPointSizeF(MainWindowDesign::CaptionPointSize);
+    m_listView->setFont(captionFont);
 
     m_tmrIcons = new QTimer(this);
     m_tmrIcons->setObjectName(QStringLiteral("tmrIcons"));
@@ -150,6 +154,7 @@ void frmMain::ChangeLocalizeCaptions()
     m_label4->setText(Translate(690));
     setWindowTitle(productName);
     captionMenus();
+    keepActionsButtonAtRightEdge();
 }
 
 void frmMain::showEvent(QShowEvent* event)
@@ -197,16 +202,15 @@ void frmMain::keepActionsButtonAtRightEdge()
 {
     if (m_actionsRightMargin <= 0)
         return;
-    const int shift = width() - m_actionsRightMargin - m_labActions->geometry().right();
-    if (shift == 0)
-        return;
-    const int imageLeft = m_imgActions->x() + shift;
-    const int labelLeft = m_labActions->x() + shift;
+    // The caption decides the button's width, so that every language keeps the same margin on the right.
+    const int labelWidth = m_labActions->sizeHint().width();
+    const int labelLeft = width() - m_actionsRightMargin - labelWidth;
+    const int imageLeft = labelLeft - MainWindowDesign::ActionsGapPixels - m_imgActions->width();
     // The button stays clear of the title when the window gets narrow.
     if (imageLeft < m_label3->x() + m_label3->fontMetrics().horizontalAdvance(m_label3->text()) + 16)
         return;
+    m_labActions->setGeometry(labelLeft, m_labActions->y(), labelWidth, m_labActions->height());
     m_imgActions->move(imageLeft, m_imgActions->y());
-    m_labActions->move(labelLeft, m_labActions->y());
 }
 
 void frmMain::closeEvent(QCloseEvent* event)

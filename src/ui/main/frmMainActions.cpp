@@ -43,8 +43,10 @@ void frmMain::connectGameActions()
     connect(m_listView, &SimpleListView::EnterKey, this, &frmMain::listEnterKey, Qt::DirectConnection);
     connect(m_listView, &SimpleListView::MouseUp, this,
         [this](qint16 button, qint16, float, float) { listMouseUp(button); });
-    connect(m_listView, &SimpleListView::OLEDragDrop, this,
-        [this](const QMimeData* dropped, qint32& effect, qint16, qint16, float, float) { listDragDrop(dropped, effect); },
+    connect(
+        m_listView, &SimpleListView::OLEDragDrop, this,
+        [this](
+            const QMimeData* dropped, qint32& effect, qint16, qint16, float, float) { listDragDrop(dropped, effect); },
         Qt::DirectConnection);
 }
 
@@ -70,8 +72,8 @@ void frmMain::mnuOpenGameClick()
 
 void frmMain::mnuInstallClick()
 {
-    const QString package = QuilletCalls::ShowOpenDialog(this, InstallDialogTitle(), InstallDialogFilter(), 1,
-        m_installFolder->dialogFolder());
+    const QString package = QuilletCalls::ShowOpenDialog(
+        this, InstallDialogTitle(), InstallDialogFilter(), 1, m_installFolder->dialogFolder());
     if (package.isEmpty())
         return;
     m_installFolder->packageChosen(package);

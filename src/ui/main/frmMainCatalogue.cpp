@@ -101,8 +101,8 @@ void frmMain::tmrIconsTimer()
     const std::optional<IconCacheBuilder::Done> done = m_iconBuilder->Tick(m_closing);
     if (!done)
         return;
-    const QPixmap picture = done->result.picture.isNull() ? m_imgNoIcon->Picture()
-                                                          : QPixmap::fromImage(done->result.picture);
+    const QPixmap picture
+        = done->result.picture.isNull() ? m_imgNoIcon->Picture() : QPixmap::fromImage(done->result.picture);
     // Removing an item moves the ones after it up by one, so the ticket only says where to look first.
     int index = int(done->ticket);
     if (m_listView->imgN(index).Data() != done->path) {

@@ -19,8 +19,8 @@ void frmMain::connectMediaHost()
         host->RunGame(path, caption);
     });
     connect(this, &frmMain::closing, this, [this] {
-        const auto mode = m_closedByUser ? ReclamaSchedule::UnloadMode::FormControlMenu
-                                         : ReclamaSchedule::UnloadMode::FormCode;
+        const auto mode
+            = m_closedByUser ? ReclamaSchedule::UnloadMode::FormControlMenu : ReclamaSchedule::UnloadMode::FormCode;
         if (qApp->isSavingSession())
             return;
         if (const std::optional<ReclamaSchedule::DueReclama> due = ReclamaSchedule::ReclamaToShow(mode)) {

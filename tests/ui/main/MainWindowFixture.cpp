@@ -11,11 +11,11 @@
 
 #include <QApplication>
 #include <QDesktopServices>
+#include <QDialog>
 #include <QDir>
 #include <QFile>
 #include <QFileInfo>
 #include <QImage>
-#include <QDialog>
 #include <QLibrary>
 #include <QPointer>
 #include <QTimer>

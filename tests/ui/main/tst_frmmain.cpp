@@ -58,8 +58,8 @@ int indexOfCaption(SimpleListView* list, const QString& caption)
 
 bool samePicture(const QPixmap& a, const QPixmap& b)
 {
-    return !a.isNull() && a.toImage().convertToFormat(QImage::Format_ARGB32)
-        == b.toImage().convertToFormat(QImage::Format_ARGB32);
+    return !a.isNull()
+        && a.toImage().convertToFormat(QImage::Format_ARGB32) == b.toImage().convertToFormat(QImage::Format_ARGB32);
 }
 
 // The names of a menu's items in order, "-" for a separator.
@@ -103,10 +103,7 @@ private:
         return window;
     }
 
-    static void waitForIcons(frmMain* window)
-    {
-        QTRY_COMPARE_WITH_TIMEOUT(window->pendingIcons(), 0, 10000);
-    }
+    static void waitForIcons(frmMain* window) { QTRY_COMPARE_WITH_TIMEOUT(window->pendingIcons(), 0, 10000); }
 
     void switchTo(const QString& fileName)
     {
@@ -140,7 +137,8 @@ private Q_SLOTS:
         QTest::addColumn<QString>("english");
         QTest::addColumn<QString>("russian");
         const auto row = [](const char* name, const char* english, const char* russian) {
-            QTest::newRow(name) << QString::fromLatin1(name) << QString::fromUtf8(english) << QString::fromUtf8(russian);
+            QTest::newRow(name) << QString::fromLatin1(name) << QString::fromUtf8(english)
+                                << QString::fromUtf8(russian);
         };
         row("frmMain", "Brimvault", "Brimvault");
         row("labActions", "Actions", "Действия");
@@ -429,8 +427,10 @@ private Q_SLOTS:
         QTest::addColumn<QString>("languageFile");
         QTest::addColumn<QString>("helpFile");
         QTest::newRow("built-in language") << QString() << QString();
-        QTest::newRow("Russian") << "Brimvault_Russian.lng" << "Brimvault_Russian.html";
-        QTest::newRow("Polish") << "Brimvault_Polish.lng" << "Brimvault_Polish.html";
+        QTest::newRow("Russian") << "Brimvault_Russian.lng"
+                                 << "Brimvault_Russian.html";
+        QTest::newRow("Polish") << "Brimvault_Polish.lng"
+                                << "Brimvault_Polish.html";
     }
     void helpFollowsTheLanguage()
     {
@@ -438,7 +438,8 @@ private Q_SLOTS:
         QFETCH(QString, helpFile);
         frmMain window;
         switchTo(languageFile);
-        const QString expected = helpFile.isEmpty() ? m_program->builtInHelpFile() : m_program->path() + u'/' + helpFile;
+        const QString expected
+            = helpFile.isEmpty() ? m_program->builtInHelpFile() : m_program->path() + u'/' + helpFile;
         QVERIFY(QFileInfo::exists(expected));
         UrlCatcher catcher;
         window.findChild<QAction*>(QStringLiteral("mnuHelp"))->trigger();
@@ -450,7 +451,8 @@ private Q_SLOTS:
         frmMain window;
         UrlCatcher catcher;
         window.findChild<QAction*>(QStringLiteral("mnuGetMoreGames"))->trigger();
-        QCOMPARE(catcher.opened, QList<QUrl> {QUrl(QStringLiteral("http://127.0.0.1:9/more-games.asp?product=Brimvault"))});
+        QCOMPARE(
+            catcher.opened, QList<QUrl> {QUrl(QStringLiteral("http://127.0.0.1:9/more-games.asp?product=Brimvault"))});
 
         QStringList shown;
         WhenModalShows([&](QWidget* modal) {
@@ -510,7 +512,8 @@ private Q_SLOTS:
         QCOMPARE(window->Label3()->geometry(), FormScaling::TwipsToPixels(MainWindowDesign::Label3Twips, design));
         QCOMPARE(window->ListView1()->geometry(),
             MainWindowDesign::ListViewGeometry(window->size(), FormScaling::ScreenTwipsPerPixel(window.get())));
-        QTest::mouseClick(window->ListView1(), Qt::LeftButton, {}, window->ListView1()->imgN(3).geometry().center().toPoint());
+        QTest::mouseClick(
+            window->ListView1(), Qt::LeftButton, {}, window->ListView1()->imgN(3).geometry().center().toPoint());
 
         const QString folder = QStringLiteral(BRIMVAULT_SCREENSHOT_DIR);
         QVERIFY(QDir().mkpath(folder));
@@ -533,6 +536,11 @@ private Q_SLOTS:
         QTRY_VERIFY(window->mnuActions()->isVisible());
         QVERIFY(window->mnuActions()->grab().save(folder + QStringLiteral("/actions-menu-%1.png").arg(dpi)));
         window->mnuActions()->hide();
+
+        switchTo(QStringLiteral("Brimvault_Russian.lng"));
+        window->RebuildList();
+        waitForIcons(window.get());
+        QVERIFY(window->grab().save(folder + QStringLiteral("/main-%1-russian.png").arg(dpi)));
     }
 };
 

@@ -42,12 +42,18 @@ private Q_SLOTS:
         QTest::addColumn<QString>("progId");
         QTest::addColumn<QString>("method");
         QTest::addColumn<int>("argumentCount");
-        QTest::newRow("CenterForm") << "Quillet.clsFormFuncs" << "CenterForm" << 1;
-        QTest::newRow("ShowOpenSaveDialog") << "Quillet.CComDlg" << "ShowOpenSaveDialog" << 7;
-        QTest::newRow("BrowseForFolder") << "Quillet.CComDlg" << "BrowseForFolder" << 3;
-        QTest::newRow("ShowAbout") << "Quillet.clsAbout" << "ShowAbout" << 0;
-        QTest::newRow("GetHelp") << "Quillet.clsGetHelp" << "GetHelp" << 1;
-        QTest::newRow("ProgID in other letter case") << "quillet.CLSGETHELP" << "gethelp" << 1;
+        QTest::newRow("CenterForm") << "Quillet.clsFormFuncs"
+                                    << "CenterForm" << 1;
+        QTest::newRow("ShowOpenSaveDialog") << "Quillet.CComDlg"
+                                            << "ShowOpenSaveDialog" << 7;
+        QTest::newRow("BrowseForFolder") << "Quillet.CComDlg"
+                                         << "BrowseForFolder" << 3;
+        QTest::newRow("ShowAbout") << "Quillet.clsAbout"
+                                   << "ShowAbout" << 0;
+        QTest::newRow("GetHelp") << "Quillet.clsGetHelp"
+                                 << "GetHelp" << 1;
+        QTest::newRow("ProgID in other letter case") << "quillet.CLSGETHELP"
+                                                     << "gethelp" << 1;
     }
     void methodsCallableByName()
     {
@@ -113,8 +119,8 @@ private Q_SLOTS:
         const CallOutcome outcome = CallByName(keep(created, QStringLiteral("Quillet.CComDlg")),
             QStringLiteral("ShowOpenSaveDialog"),
             {QVariant::fromValue<QObject*>(nullptr), QStringLiteral("Add game file"),
-                QStringLiteral("All files (*.exe;*.swf)|*.exe;*.swf|EXE files (*.exe)|*.exe|SWF files (*.swf)|*.swf"), 2,
-                folder, 0x81800, false});
+                QStringLiteral("All files (*.exe;*.swf)|*.exe;*.swf|EXE files (*.exe)|*.exe|SWF files (*.swf)|*.swf"),
+                2, folder, 0x81800, false});
         QVERIFY2(outcome.ok, qPrintable(outcome.error));
         QCOMPARE(outcome.value.toString(), game);
         QCOMPARE(title, QStringLiteral("Add game file"));
@@ -140,7 +146,8 @@ private Q_SLOTS:
         const QVariant none = QVariant::fromValue<QObject*>(nullptr);
         const CallOutcome outcome = method == u"BrowseForFolder"
             ? CallByName(dialogs, method, {none, QStringLiteral("Add games from folder"), m_env->root()})
-            : CallByName(dialogs, method, {none, QStringLiteral("t"), QStringLiteral("A|*.a"), 1, m_env->root(), 0, false});
+            : CallByName(
+                dialogs, method, {none, QStringLiteral("t"), QStringLiteral("A|*.a"), 1, m_env->root(), 0, false});
         QVERIFY(outcome.ok);
         QVERIFY(outcome.value.toString().isEmpty());
     }
@@ -160,9 +167,9 @@ private Q_SLOTS:
             static_cast<QDialog*>(dialog)->accept();
         });
         CreatedObject created;
-        const CallOutcome outcome = CallByName(keep(created, QStringLiteral("Quillet.CComDlg")),
-            QStringLiteral("BrowseForFolder"),
-            {QVariant::fromValue<QObject*>(nullptr), QStringLiteral("Add games from folder"), m_env->root()});
+        const CallOutcome outcome
+            = CallByName(keep(created, QStringLiteral("Quillet.CComDlg")), QStringLiteral("BrowseForFolder"),
+                {QVariant::fromValue<QObject*>(nullptr), QStringLiteral("Add games from folder"), m_env->root()});
         QCOMPARE(outcome.value.toString(), folder);
         QCOMPARE(title, QStringLiteral("Add games from folder"));
     }
@@ -218,11 +225,12 @@ private Q_SLOTS:
         QTest::addColumn<QString>("argument");
         QTest::addColumn<QUrl>("expected");
         QTest::newRow("help file") << "HELPFILE" << QUrl();
-        QTest::newRow("address") << "https://example.org/help.html" << QUrl(QStringLiteral("https://example.org/help.html"));
-        QTest::newRow("more games")
-            << "BrimvaultMoreGames" << QUrl(QStringLiteral("http://127.0.0.1:9/more-games.asp?product=Brimvault"));
-        QTest::newRow("more games, blanks around") << "  BrimvaultMoreGames "
-                                                   << QUrl(QStringLiteral("http://127.0.0.1:9/more-games.asp?product=Brimvault"));
+        QTest::newRow("address") << "https://example.org/help.html"
+                                 << QUrl(QStringLiteral("https://example.org/help.html"));
+        QTest::newRow("more games") << "BrimvaultMoreGames"
+                                    << QUrl(QStringLiteral("http://127.0.0.1:9/more-games.asp?product=Brimvault"));
+        QTest::newRow("more games, blanks around")
+            << "  BrimvaultMoreGames " << QUrl(QStringLiteral("http://127.0.0.1:9/more-games.asp?product=Brimvault"));
     }
     void getHelpOpensInTheBrowser()
     {
