@@ -97,12 +97,20 @@ int main(int argc, char** argv)
                 (void)f.readAll();
         }
     });
-    const QString target = scratch.filePath(QStringLiteral("main.ico"));
+    // Every pass writes new files into a folder of its own, as the icon cache writes one new file per game:
+    // overwriting the same file again and again would measure the file system's flush-on-truncate instead.
+    int pass = 0;
+    const auto passFolder = [&](const QString& prefix) {
+        const QString folder = scratch.filePath(prefix + QString::number(++pass));
+        QDir().mkpath(folder);
+        return folder + u'/';
+    };
     const double ours = secondsPerPass([&] {
-        for (const QString& file : files) {
+        const QString folder = passFolder(QStringLiteral("ours-"));
+        for (qsizetype i = 0; i < files.size(); ++i) {
             cFileIcon icon;
-            if (icon.LoadMainIconFromEXE(file))
-                icon.SaveIcon(target);
+            if (icon.LoadMainIconFromEXE(files.at(i)))
+                icon.SaveIcon(folder + QString::number(i) + QStringLiteral(".ico"));
         }
     });
 
@@ -117,9 +125,8 @@ int main(int argc, char** argv)
         return 0;
     }
     // One wrestool process per file, as a tool that extracts one game's icon at a time would run it.
-    const QString wrestoolOut = scratch.filePath(QStringLiteral("wrestool"));
-    QDir().mkpath(wrestoolOut);
     const double reference = secondsPerPass([&] {
+        const QString wrestoolOut = passFolder(QStringLiteral("wrestool-"));
         for (const QString& file : files) {
             QProcess process;
             process.setStandardOutputFile(QProcess::nullDevice());
@@ -132,6 +139,7 @@ int main(int argc, char** argv)
     });
     // And all files in one wrestool process, its best case.
     const double referenceBatch = secondsPerPass([&] {
+        const QString wrestoolOut = passFolder(QStringLiteral("wrestool-batch-"));
         QProcess process;
         process.setStandardOutputFile(QProcess::nullDevice());
         process.setStandardErrorFile(QProcess::nullDevice());

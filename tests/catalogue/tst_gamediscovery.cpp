@@ -22,6 +22,7 @@ private Q_SLOTS:
     void onlyTheOnlineEntry();
     void installedGames();
     void flashMoviesOnlyInTheGamesFolder();
+    void linkBackUpTheTreeEnds();
     void addedGames();
     void classicGames();
     void microsoftGamesFolder_data();
@@ -146,6 +147,18 @@ void TestGameDiscovery::flashMoviesOnlyInTheGamesFolder()
     for (const GameEntry& entry : run.entries.mid(1))
         QCOMPARE(entry.source, entry.path.endsWith(u".swf"_qs) ? IconSource::Flash : IconSource::Queued);
     QCOMPARE(run.result.queuedIcons, 1);
+}
+
+void TestGameDiscovery::linkBackUpTheTreeEnds()
+{
+    QVERIFY(writeFile(games(QStringLiteral("a/game.exe"))));
+    QVERIFY(QFile::link(games(QStringLiteral("a")), games(QStringLiteral("a/loop"))));
+    QVERIFY(QFile::link(m_env->path(QStringLiteral("commonappdata")), games(QStringLiteral("a/up"))));
+    const Run run = discover(CatalogueLocations::fromSystem());
+    const QStringList paths = pathsOf(run.entries);
+    QVERIFY(paths.contains(games(QStringLiteral("a/game.exe"))));
+    // A link is walked into once at most: it may show the linked folder's own files, never more.
+    QVERIFY2(paths.size() <= 4, qPrintable(paths.join(u'\n')));
 }
 
 void TestGameDiscovery::addedGames()

@@ -19,6 +19,7 @@
 #include <QCloseEvent>
 #include <QCoreApplication>
 #include <QLinearGradient>
+#include <QMenu>
 #include <QPainter>
 #include <QScopeGuard>
 #include <QTimer>
@@ -60,7 +61,13 @@ frmMain::frmMain(QWidget* parent)
     QuilletCalls::CenterForm(this);
 }
 
-frmMain::~frmMain() = default;
+frmMain::~frmMain()
+{
+    for (QMenu* menu : {m_mnuActions.data(), m_mnuItemPopup.data()}) {
+        if (menu)
+            menu->deleteLater();
+    }
+}
 
 void frmMain::createControls()
 {

@@ -1,5 +1,7 @@
 #pragma once
 
+#include <QMenu>
+#include <QPointer>
 #include <QString>
 #include <QWidget>
 
@@ -7,7 +9,6 @@
 
 class QAction;
 class QLabel;
-class QMenu;
 class QMimeData;
 class QTimer;
 
@@ -66,6 +67,8 @@ public:
     ImageCtrl* imgGbStels() const { return m_imgGbStels; }
     QMenu* mnuActions() const { return m_mnuActions; }
     QMenu* mnuItemPopup() const { return m_mnuItemPopup; }
+    // An item of either menu by its name ("mnuAddFile"), or null.
+    QAction* menuItem(const QString& name) const;
     QTimer* tmrIcons() const { return m_tmrIcons; }
 
     bool isClosing() const { return m_closing; }
@@ -132,8 +135,10 @@ private:
     ItemMenuDelay* m_tmrMenu = nullptr;
     ServiceSignalWatcher* m_tmrRegTest = nullptr;
 
-    QMenu* m_mnuActions = nullptr;
-    QMenu* m_mnuItemPopup = nullptr;
+    // Pop-up menus are windows of their own; they are not the window's children, so that code closing all
+    // top-level windows at once never meets them twice.
+    QPointer<QMenu> m_mnuActions;
+    QPointer<QMenu> m_mnuItemPopup;
 
     std::unique_ptr<ListBuilder> m_builder;
     std::unique_ptr<IconCacheBuilder> m_iconBuilder;

@@ -55,7 +55,7 @@ QAction* frmMain::addMenuItem(QMenu* menu, const char* name, void (frmMain::*com
 
 void frmMain::createMenus()
 {
-    m_mnuActions = new QMenu(this);
+    m_mnuActions = new QMenu;
     m_mnuActions->setObjectName(QStringLiteral("mnuActions"));
     addMenuItem(m_mnuActions, "mnuAddFile", &frmMain::mnuAddFileClick);
     addMenuItem(m_mnuActions, "mnuAddFolder", &frmMain::mnuAddFolderClick);
@@ -72,7 +72,7 @@ void frmMain::createMenus()
     m_mnuActions->addSeparator();
     addMenuItem(m_mnuActions, "mnuAbout", &frmMain::mnuAboutClick);
 
-    m_mnuItemPopup = new QMenu(QStringLiteral("ItemPopup"), this);
+    m_mnuItemPopup = new QMenu(QStringLiteral("ItemPopup"));
     m_mnuItemPopup->setObjectName(QStringLiteral("mnuItemPopup"));
     addMenuItem(m_mnuItemPopup, "mnuOpenGame", &frmMain::mnuOpenGameClick);
     m_mnuItemPopup->addSeparator();
@@ -80,11 +80,20 @@ void frmMain::createMenus()
     addMenuItem(m_mnuItemPopup, "mnuRemoveFile", &frmMain::mnuRemoveFileClick);
 }
 
+QAction* frmMain::menuItem(const QString& name) const
+{
+    for (QMenu* menu : {m_mnuActions.data(), m_mnuItemPopup.data()}) {
+        if (auto* action = menu ? menu->findChild<QAction*>(name, Qt::FindDirectChildrenOnly) : nullptr)
+            return action;
+    }
+    return nullptr;
+}
+
 void frmMain::captionMenus()
 {
     m_mnuActions->setTitle(menuText(modLocalizer::Translate(1060)));
     for (const MenuCaption& caption : menuCaptions) {
-        if (auto* action = findChild<QAction*>(QString::fromLatin1(caption.name)))
+        if (QAction* action = menuItem(QString::fromLatin1(caption.name)))
             action->setText(menuText(modLocalizer::Translate(caption.number)));
     }
 }

@@ -77,7 +77,7 @@ QString captionOf(frmMain* window, const QString& name)
         return window->windowTitle();
     if (name == u"mnuActions")
         return window->mnuActions()->title();
-    if (auto* action = window->findChild<QAction*>(name))
+    if (auto* action = window->menuItem(name))
         return action->text();
     return window->findChild<QLabel*>(name)->text();
 }
@@ -277,7 +277,7 @@ private Q_SLOTS:
             dialog->selectFile(game);
             static_cast<QDialog*>(dialog)->accept();
         });
-        window->findChild<QAction*>(QStringLiteral("mnuAddFile"))->trigger();
+        window->menuItem(QStringLiteral("mnuAddFile"))->trigger();
         QCOMPARE(title, QStringLiteral("Add game file"));
         QCOMPARE(directory, m_env->path(QStringLiteral("personal")));
         QCOMPARE(filters,
@@ -297,14 +297,14 @@ private Q_SLOTS:
             dialog->selectFile(game);
             static_cast<QDialog*>(dialog)->accept();
         });
-        window->findChild<QAction*>(QStringLiteral("mnuAddFile"))->trigger();
+        window->menuItem(QStringLiteral("mnuAddFile"))->trigger();
         QCOMPARE(directory, folder);
         QCOMPARE(setting(QStringLiteral("Files"), QStringLiteral("Count")), QStringLiteral("1"));
         QCOMPARE(window->ListView1()->layoutState().itemCount, before + 1);
 
         // Cancelled: nothing changes.
         WhenModalShows([](QWidget* modal) { qobject_cast<QDialog*>(modal)->reject(); });
-        window->findChild<QAction*>(QStringLiteral("mnuAddFile"))->trigger();
+        window->menuItem(QStringLiteral("mnuAddFile"))->trigger();
         QCOMPARE(window->ListView1()->layoutState().itemCount, before + 1);
         QCOMPARE(window->lastAddFileFolder(), folder + u'/');
     }
@@ -325,21 +325,27 @@ private Q_SLOTS:
             auto* dialog = qobject_cast<QFileDialog*>(modal);
             QVERIFY(dialog);
             title = dialog->windowTitle();
-            dialog->selectFile(root);
+            dialog->setDirectory(root);
             static_cast<QDialog*>(dialog)->accept();
         });
-        window->findChild<QAction*>(QStringLiteral("mnuAddFolder"))->trigger();
+        window->menuItem(QStringLiteral("mnuAddFolder"))->trigger();
         QCOMPARE(title, QStringLiteral("Add games from folder"));
         QCOMPARE(setting(QStringLiteral("Files"), QStringLiteral("Count")), QStringLiteral("3"));
-        QCOMPARE(QDir::cleanPath(setting(QStringLiteral("Files"), QStringLiteral("File1"))),
-            root + QStringLiteral("/Sub/racer.exe"));
-        QCOMPARE(QDir::cleanPath(setting(QStringLiteral("Files"), QStringLiteral("File2"))),
-            root + QStringLiteral("/Sub/Deeper/movie.swf"));
-        QCOMPARE(QDir::cleanPath(setting(QStringLiteral("Files"), QStringLiteral("File3"))),
-            root + QStringLiteral("/arcade.exe"));
-        QCOMPARE(captionsOf(window->ListView1()).mid(before),
-            QStringList({QStringLiteral("racer"), QStringLiteral("movie"), QStringLiteral("arcade")}));
-        const int movie = before + 1;
+        QStringList stored;
+        for (const char* key : {"File1", "File2", "File3"})
+            stored << QDir::cleanPath(setting(QStringLiteral("Files"), QString::fromLatin1(key)));
+        stored.sort();
+        QCOMPARE(stored,
+            QStringList({root + QStringLiteral("/Sub/Deeper/movie.swf"), root + QStringLiteral("/Sub/racer.exe"),
+                root + QStringLiteral("/arcade.exe")}));
+        // Each added game is shown at once, in the order it was recorded.
+        QStringList shown = captionsOf(window->ListView1()).mid(before);
+        QCOMPARE(shown.size(), 3);
+        for (int i = 0; i < 3; ++i) {
+            const QString recorded = setting(QStringLiteral("Files"), QStringLiteral("File%1").arg(i + 1));
+            QCOMPARE(window->ListView1()->labN(before + i).tag(), recorded);
+        }
+        const int movie = before + int(shown.indexOf(QStringLiteral("movie")));
         QVERIFY(samePicture(window->ListView1()->imgN(movie).Picture(), window->imgSWF()->Picture()));
     }
 
@@ -379,7 +385,7 @@ private Q_SLOTS:
         m_program = std::make_unique<ProgramFolderFixture>(false);
         auto window = openWindow();
         QSignalSpy rebuilt(window.get(), &frmMain::listRebuilt);
-        window->findChild<QAction*>(QStringLiteral("mnuLanguage"))->trigger();
+        window->menuItem(QStringLiteral("mnuLanguage"))->trigger();
         QCOMPARE(m_prompts.size(), 1);
         QCOMPARE(m_prompts.first().text, QStringLiteral("Language files not found"));
         QCOMPARE(window->labActions()->text(), QStringLiteral("Actions"));
@@ -399,14 +405,14 @@ private Q_SLOTS:
                 dialog->cbLanguages()->setCurrentIndex(entry);
                 QTest::mouseClick(dialog->cmdOK(), Qt::LeftButton);
             });
-            window->findChild<QAction*>(QStringLiteral("mnuLanguage"))->trigger();
+            window->menuItem(QStringLiteral("mnuLanguage"))->trigger();
         };
 
         choose(2);
         QCOMPARE(setting(QStringLiteral("LocaleSettings"), QStringLiteral("LngFileName")),
             QStringLiteral("Brimvault_Russian.lng"));
         QCOMPARE(window->labActions()->text(), QString::fromUtf8("Действия"));
-        QCOMPARE(window->findChild<QAction*>(QStringLiteral("mnuAbout"))->text(), QString::fromUtf8("О программе..."));
+        QCOMPARE(window->menuItem(QStringLiteral("mnuAbout"))->text(), QString::fromUtf8("О программе..."));
         QCOMPARE(window->ListView1()->labN(0).text(), QString::fromUtf8("Онлайн-игры"));
         // Names from the games' information files, and the publisher's own names by file title.
         QVERIFY(indexOfCaption(window->ListView1(), QString::fromUtf8("Цветные линии")) > 0);
@@ -442,7 +448,7 @@ private Q_SLOTS:
             = helpFile.isEmpty() ? m_program->builtInHelpFile() : m_program->path() + u'/' + helpFile;
         QVERIFY(QFileInfo::exists(expected));
         UrlCatcher catcher;
-        window.findChild<QAction*>(QStringLiteral("mnuHelp"))->trigger();
+        window.menuItem(QStringLiteral("mnuHelp"))->trigger();
         QCOMPARE(catcher.opened, QList<QUrl> {QUrl::fromLocalFile(expected)});
     }
 
@@ -450,7 +456,7 @@ private Q_SLOTS:
     {
         frmMain window;
         UrlCatcher catcher;
-        window.findChild<QAction*>(QStringLiteral("mnuGetMoreGames"))->trigger();
+        window.menuItem(QStringLiteral("mnuGetMoreGames"))->trigger();
         QCOMPARE(
             catcher.opened, QList<QUrl> {QUrl(QStringLiteral("http://127.0.0.1:9/more-games.asp?product=Brimvault"))});
 
@@ -460,7 +466,7 @@ private Q_SLOTS:
                 shown << modal->findChild<QLabel*>(QString::fromLatin1(name))->text();
             qobject_cast<QDialog*>(modal)->accept();
         });
-        window.findChild<QAction*>(QStringLiteral("mnuAbout"))->trigger();
+        window.menuItem(QStringLiteral("mnuAbout"))->trigger();
         QCOMPARE(shown,
             QStringList({QStringLiteral("Brimvault"), QStringLiteral("Version " BRIMVAULT_VERSION),
                 QString::fromUtf8("Copyright © Brimvault Games. All rights reserved.")}));
@@ -473,6 +479,81 @@ private Q_SLOTS:
         window->ListView1()->setFocus();
         QTest::keyClick(window->ListView1(), Qt::Key_Return);
         QCOMPARE(catcher.opened, QList<QUrl> {QUrl(QStringLiteral("http://127.0.0.1:9/online-games-catalog.asp"))});
+    }
+
+    void itemMenuRenamesAndRemovesTheClickedGame()
+    {
+        const SampleLibrary library = BuildSampleLibrary(*m_env);
+        auto window = openWindow();
+        SimpleListView* list = window->ListView1();
+        const int added = indexOfCaption(list, QStringLiteral("My Puzzle"));
+        QTest::mouseClick(list, Qt::LeftButton, {}, list->imgN(added).geometry().center().toPoint());
+
+        QList<InputRequest> asked;
+        SetInputHandler([&](const InputRequest& request) -> std::optional<QString> {
+            asked.append(request);
+            return QStringLiteral("Evening Puzzle");
+        });
+        window->menuItem(QStringLiteral("mnuRenameGame"))->trigger();
+        SetInputHandler({});
+        QCOMPARE(asked.size(), 1);
+        QCOMPARE(asked.first().defaultText, QStringLiteral("My Puzzle"));
+        QCOMPARE(list->labN(added).text(), QStringLiteral("Evening Puzzle"));
+        QCOMPARE(setting(QStringLiteral("FilesNames"), QStringLiteral("FileName1")), QStringLiteral("Evening Puzzle"));
+
+        const int before = list->layoutState().itemCount;
+        window->menuItem(QStringLiteral("mnuRemoveFile"))->trigger();
+        QCOMPARE(m_prompts.size(), 1);
+        QCOMPARE(m_prompts.first().text, QStringLiteral("Remove Evening Puzzle?"));
+        QCOMPARE(m_prompts.first().buttons, PromptButtons::YesNo);
+        // The recording handler answers Ok, which is not Yes: nothing is removed.
+        QCOMPARE(list->layoutState().itemCount, before);
+
+        SetPromptHandler([](const PromptRequest&) { return PromptAnswer::Yes; });
+        window->menuItem(QStringLiteral("mnuRemoveFile"))->trigger();
+        QCOMPARE(list->layoutState().itemCount, before - 1);
+        QCOMPARE(indexOfCaption(list, QStringLiteral("Evening Puzzle")), -1);
+        QVERIFY(setting(QStringLiteral("Files"), QStringLiteral("File1")).isEmpty());
+        QVERIFY(QFileInfo::exists(library.addedGame));
+    }
+
+    void serviceSignalRebuildsTheList()
+    {
+        auto window = openWindow();
+        const int before = window->ListView1()->layoutState().itemCount;
+        QVERIFY(WriteFile(m_env->path(QStringLiteral("commonappdata/Brimvault/Fresh/fresh.exe"))));
+        SaveSetting(AppTitle(), QStringLiteral("Commands"), QStringLiteral("NewGameInstalled"), QStringLiteral("1"));
+        QTRY_COMPARE_WITH_TIMEOUT(window->ListView1()->layoutState().itemCount, before + 1, 8000);
+        QCOMPARE(setting(QStringLiteral("Commands"), QStringLiteral("NewGameInstalled")), QStringLiteral("0"));
+        QVERIFY(indexOfCaption(window->ListView1(), QStringLiteral("fresh")) > 0);
+    }
+
+    void installWithoutTheServiceReportsTheFailure()
+    {
+        const QString package = m_env->path(QStringLiteral("personal/Downloads/racer.bvxpak"));
+        QVERIFY(WriteFile(package, QByteArrayLiteral("PK")));
+        auto window = openWindow();
+        QSignalSpy rebuilt(window.get(), &frmMain::listRebuilt);
+        QString title;
+        QStringList filters;
+        QString directory;
+        WhenModalShows([&](QWidget* modal) {
+            auto* dialog = qobject_cast<QFileDialog*>(modal);
+            QVERIFY(dialog);
+            title = dialog->windowTitle();
+            filters = dialog->nameFilters();
+            directory = dialog->directory().absolutePath();
+            dialog->selectFile(package);
+            static_cast<QDialog*>(dialog)->accept();
+        });
+        window->menuItem(QStringLiteral("mnuInstall"))->trigger();
+        QCOMPARE(title, QStringLiteral("Install game"));
+        QCOMPARE(filters, QStringList {QStringLiteral("BVXPAK files (*.bvxpak)")});
+        QCOMPARE(directory, m_env->path(QStringLiteral("personal")));
+        QCOMPARE(m_prompts.size(), 1);
+        QCOMPARE(m_prompts.first().text, QStringLiteral("There was an error! The game isn't installed!"));
+        QCOMPARE(m_prompts.first().icon, PromptIcon::Critical);
+        QCOMPARE(rebuilt.count(), 0);
     }
 
     void closingStopsTheIconBuilder()
@@ -526,12 +607,12 @@ private Q_SLOTS:
             modal->grab().save(folder + QStringLiteral("/languages-%1.png").arg(dpi));
             qobject_cast<QDialog*>(modal)->reject();
         });
-        window->findChild<QAction*>(QStringLiteral("mnuLanguage"))->trigger();
+        window->menuItem(QStringLiteral("mnuLanguage"))->trigger();
         WhenModalShows([&](QWidget* modal) {
             modal->grab().save(folder + QStringLiteral("/about-%1.png").arg(dpi));
             qobject_cast<QDialog*>(modal)->accept();
         });
-        window->findChild<QAction*>(QStringLiteral("mnuAbout"))->trigger();
+        window->menuItem(QStringLiteral("mnuAbout"))->trigger();
         window->ShowActionsMenu();
         QTRY_VERIFY(window->mnuActions()->isVisible());
         QVERIFY(window->mnuActions()->grab().save(folder + QStringLiteral("/actions-menu-%1.png").arg(dpi)));

@@ -162,8 +162,8 @@ private Q_SLOTS:
             QVERIFY(dialog);
             title = dialog->windowTitle();
             QVERIFY(dialog->testOption(QFileDialog::ShowDirsOnly));
-            dialog->setDirectory(m_env->path(QStringLiteral("personal")));
-            dialog->selectFile(folder);
+            // In a folder, accepting with nothing typed answers that folder.
+            dialog->setDirectory(folder);
             static_cast<QDialog*>(dialog)->accept();
         });
         CreatedObject created;
