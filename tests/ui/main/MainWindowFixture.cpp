@@ -14,10 +14,12 @@
 #include <QDialog>
 #include <QDir>
 #include <QFile>
+#include <QFileDialog>
 #include <QFileInfo>
 #include <QImage>
 #include <QLibrary>
 #include <QPointer>
+#include <QTest>
 #include <QTimer>
 #include <QWidget>
 
@@ -167,4 +169,24 @@ UrlCatcher::~UrlCatcher()
 {
     for (const char* scheme : {"file", "http", "https"})
         QDesktopServices::unsetUrlHandler(QString::fromLatin1(scheme));
+}
+
+void ChooseInFileDialog(QWidget* fileDialog, const QString& path)
+{
+    auto* dialog = qobject_cast<QFileDialog*>(fileDialog);
+    if (!dialog)
+        return;
+    const QFileInfo chosen(path);
+    if (chosen.isDir()) {
+        // In a folder, accepting with nothing typed answers that folder.
+        dialog->setDirectory(chosen.absoluteFilePath());
+    } else {
+        dialog->setDirectory(chosen.absolutePath());
+        dialog->selectFile(chosen.fileName());
+    }
+    // The dialog reads folders in the background; accepting before it has the file would answer nothing.
+    const QString expected = QDir::cleanPath(chosen.absoluteFilePath());
+    for (int i = 0; i < 200 && QDir::cleanPath(dialog->selectedFiles().value(0)) != expected; ++i)
+        QTest::qWait(10);
+    static_cast<QDialog*>(dialog)->accept();
 }

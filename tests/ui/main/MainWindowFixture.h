@@ -52,6 +52,9 @@ struct SampleLibrary {
 };
 SampleLibrary BuildSampleLibrary(const TestEnvironment& environment);
 
+// Chooses a file or a folder in an open file dialog, once the dialog has taken it in, and accepts it.
+void ChooseInFileDialog(QWidget* fileDialog, const QString& path);
+
 // Runs act on the next modal window (dialog or message box) as soon as it shows.
 void WhenModalShows(const std::function<void(QWidget*)>& act);
 

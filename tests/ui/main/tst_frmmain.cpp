@@ -274,8 +274,7 @@ private Q_SLOTS:
             title = dialog->windowTitle();
             directory = dialog->directory().absolutePath();
             filters = dialog->nameFilters();
-            dialog->selectFile(game);
-            static_cast<QDialog*>(dialog)->accept();
+            ChooseInFileDialog(dialog, game);
         });
         window->menuItem(QStringLiteral("mnuAddFile"))->trigger();
         QCOMPARE(title, QStringLiteral("Add game file"));
@@ -294,8 +293,7 @@ private Q_SLOTS:
         WhenModalShows([&](QWidget* modal) {
             auto* dialog = qobject_cast<QFileDialog*>(modal);
             directory = dialog->directory().absolutePath();
-            dialog->selectFile(game);
-            static_cast<QDialog*>(dialog)->accept();
+            ChooseInFileDialog(dialog, game);
         });
         window->menuItem(QStringLiteral("mnuAddFile"))->trigger();
         QCOMPARE(directory, folder);
@@ -325,8 +323,7 @@ private Q_SLOTS:
             auto* dialog = qobject_cast<QFileDialog*>(modal);
             QVERIFY(dialog);
             title = dialog->windowTitle();
-            dialog->setDirectory(root);
-            static_cast<QDialog*>(dialog)->accept();
+            ChooseInFileDialog(dialog, root);
         });
         window->menuItem(QStringLiteral("mnuAddFolder"))->trigger();
         QCOMPARE(title, QStringLiteral("Add games from folder"));
@@ -543,8 +540,7 @@ private Q_SLOTS:
             title = dialog->windowTitle();
             filters = dialog->nameFilters();
             directory = dialog->directory().absolutePath();
-            dialog->selectFile(package);
-            static_cast<QDialog*>(dialog)->accept();
+            ChooseInFileDialog(dialog, package);
         });
         window->menuItem(QStringLiteral("mnuInstall"))->trigger();
         QCOMPARE(title, QStringLiteral("Install game"));

@@ -112,8 +112,7 @@ private Q_SLOTS:
             filters = dialog->nameFilters();
             selectedFilter = dialog->selectedNameFilter();
             directory = dialog->directory().absolutePath();
-            dialog->selectFile(game);
-            static_cast<QDialog*>(dialog)->accept();
+            ChooseInFileDialog(dialog, game);
         });
         CreatedObject created;
         const CallOutcome outcome = CallByName(keep(created, QStringLiteral("Quillet.CComDlg")),
@@ -162,9 +161,7 @@ private Q_SLOTS:
             QVERIFY(dialog);
             title = dialog->windowTitle();
             QVERIFY(dialog->testOption(QFileDialog::ShowDirsOnly));
-            // In a folder, accepting with nothing typed answers that folder.
-            dialog->setDirectory(folder);
-            static_cast<QDialog*>(dialog)->accept();
+            ChooseInFileDialog(dialog, folder);
         });
         CreatedObject created;
         const CallOutcome outcome
