@@ -208,13 +208,13 @@ set(ENV{BRIMVAULT_PERSONAL} "${WORK_DIR}/home/documents")
 unset(ENV{BRIMVAULT_PROGRAM_DIR})
 
 foreach(launcher "${moved}/bin/brimvault" "${WORK_DIR}/elsewhere/brimvault")
-    execute_process(COMMAND "${launcher}" --version WORKING_DIRECTORY "${WORK_DIR}" RESULT_VARIABLE rc
+    execute_process(COMMAND "${launcher}" --version WORKING_DIRECTORY "${WORK_DIR}" TIMEOUT 30 RESULT_VARIABLE rc
         OUTPUT_VARIABLE out ERROR_VARIABLE err OUTPUT_STRIP_TRAILING_WHITESPACE)
     if(NOT (rc EQUAL 0 AND out STREQUAL "Brimvault ${VERSION}"))
         fail("${launcher} --version: exit ${rc}, printed '${out}' (want 'Brimvault ${VERSION}') ${err}")
     endif()
 endforeach()
-execute_process(COMMAND "${moved}/bin/brimvault" --help WORKING_DIRECTORY "${WORK_DIR}" RESULT_VARIABLE rc
+execute_process(COMMAND "${moved}/bin/brimvault" --help WORKING_DIRECTORY "${WORK_DIR}" TIMEOUT 30 RESULT_VARIABLE rc
     OUTPUT_VARIABLE out ERROR_VARIABLE err)
 if(NOT (rc EQUAL 0 AND out MATCHES "--version"))
     fail("brimvault --help: exit ${rc}, printed '${out}' ${err}")
@@ -222,14 +222,14 @@ endif()
 
 # Arguments reach the program unchanged, spaces included: an unknown command is refused by the program
 # itself, naming it.
-execute_process(COMMAND "${moved}/bin/brimvault" --list "not json" WORKING_DIRECTORY "${WORK_DIR}"
+execute_process(COMMAND "${moved}/bin/brimvault" --list "not json" WORKING_DIRECTORY "${WORK_DIR}" TIMEOUT 30
     RESULT_VARIABLE rc OUTPUT_VARIABLE out ERROR_VARIABLE err)
 if(NOT (NOT rc EQUAL 0 AND err MATCHES "not json"))
     fail("brimvault --list 'not json': exit ${rc}, said '${err}'")
 endif()
 
 file(REMOVE_RECURSE "${moved}/lib/brimvault/brimvault")
-execute_process(COMMAND "${moved}/bin/brimvault" --version RESULT_VARIABLE rc OUTPUT_QUIET
+execute_process(COMMAND "${moved}/bin/brimvault" --version TIMEOUT 30 RESULT_VARIABLE rc OUTPUT_QUIET
     ERROR_VARIABLE err)
 if(NOT (rc EQUAL 127 AND err MATCHES "missing"))
     fail("the launcher does not report a missing program: ${rc} ${err}")

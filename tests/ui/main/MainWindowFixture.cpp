@@ -182,6 +182,9 @@ void ChooseInFileDialog(QWidget* fileDialog, const QString& path)
         dialog->setDirectory(chosen.absoluteFilePath());
     } else {
         dialog->setDirectory(chosen.absolutePath());
+        // The dialog leaves the name field alone while the user types in it.
+        if (QWidget* focused = dialog->focusWidget())
+            focused->clearFocus();
         dialog->selectFile(chosen.fileName());
     }
     // The dialog reads folders in the background; accepting before it has the file would answer nothing.
