@@ -220,8 +220,8 @@ if(NOT (rc EQUAL 0 AND out MATCHES "--version"))
     fail("brimvault --help: exit ${rc}, printed '${out}' ${err}")
 endif()
 
-# Arguments reach the program unchanged, spaces included: an unknown command is refused by the program
-# itself, naming it.
+# Arguments reach the program unchanged, spaces included: the program itself refuses an argument --list does
+# not know, naming it.
 execute_process(COMMAND "${moved}/bin/brimvault" --list "not json" WORKING_DIRECTORY "${WORK_DIR}" TIMEOUT 30
     RESULT_VARIABLE rc OUTPUT_VARIABLE out ERROR_VARIABLE err)
 if(NOT (NOT rc EQUAL 0 AND err MATCHES "not json"))
