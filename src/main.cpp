@@ -20,6 +20,7 @@ int main(int argc, char* argv[])
     QApplication app(argc, argv);
     QApplication::setApplicationName(AppTitle());
     QApplication::setApplicationVersion(QStringLiteral(BRIMVAULT_VERSION));
+    QGuiApplication::setDesktopFileName(QStringLiteral("io.brimvault.Brimvault"));
 
     if (const std::optional<int> exitCode = CommandLine::Dispatch(QApplication::arguments().mid(1)))
         return *exitCode;

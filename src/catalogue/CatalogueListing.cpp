@@ -3,13 +3,8 @@
 #include "catalogue/CatalogueLocations.h"
 #include "catalogue/GameDiscovery.h"
 #include "catalogue/ListBuilder.h"
-#include "i18n/LocalizerState.h"
 #include "i18n/modLocalizer.h"
-#include "store/CatalogueKeys.h"
-#include "store/SettingsStore.h"
-#include "support/ProgramFolder.h"
 
-#include <QDir>
 #include <QJsonArray>
 #include <QJsonDocument>
 #include <QJsonObject>
@@ -17,55 +12,9 @@
 
 namespace Brimvault::CatalogueListing {
 
-namespace {
-
-QString fileNameOf(const QString& path)
-{
-    const qsizetype slash = qMax(path.lastIndexOf(u'\\'), path.lastIndexOf(u'/'));
-    return path.mid(slash + 1);
-}
-
-// Names stored on Windows may differ in letter case from the file on a case-sensitive file system.
-QString languageFilePath(const QString& fileName)
-{
-    const QDir folder(ProgramFolder());
-    if (folder.exists(fileName))
-        return folder.filePath(fileName);
-    const QStringList names = folder.entryList(QDir::Files | QDir::Readable);
-    for (const QString& name : names) {
-        if (name.compare(fileName, Qt::CaseInsensitive) == 0)
-            return folder.filePath(name);
-    }
-    return folder.filePath(fileName);
-}
-
-void loadLanguageFile(const QString& fileName, const QString& shortName)
-{
-    modLocalizer::detail::SetShortLanguageName(shortName);
-    modLocalizer::LoadLanguageFile(languageFilePath(fileName));
-}
-
-} // namespace
-
 void LoadLanguageWithoutStoring()
 {
-    using namespace modLocalizer;
-    const QString storedFile = fileNameOf(
-        GetSetting(AppTitle(), CatalogueKeys::LocaleSettingsSection, CatalogueKeys::LngFileNameKey).trimmed());
-    const QString storedShortName
-        = GetSetting(AppTitle(), CatalogueKeys::LocaleSettingsSection, CatalogueKeys::LngNikKey);
-    if (!storedFile.isEmpty() && storedFile.compare(BuiltInLanguageName(), Qt::CaseInsensitive) != 0) {
-        loadLanguageFile(storedFile, storedShortName.isEmpty() ? ShortNameFromFileName(storedFile) : storedShortName);
-        return;
-    }
-    const qint16 systemCharset = GetSystemCharset();
-    for (const LanguageFileInfo& file : ListLanguageFiles()) {
-        if (file.charset == systemCharset) {
-            loadLanguageFile(file.fileName, ShortNameFromFileName(file.fileName));
-            return;
-        }
-    }
-    UseBuiltInLanguage();
+    modLocalizer::InitLocalizer(modLocalizer::ChoiceStorage::ReadOnly);
 }
 
 QList<GameEntry> ListCatalogue()

@@ -3,7 +3,7 @@
 #include "store/DataFolders.h"
 #include "support/PathFunctions.h"
 #include "support/ProgramFolder.h"
-#include "support/SpecialFolders.h"
+#include "support/SystemFolders.h"
 
 namespace Brimvault {
 

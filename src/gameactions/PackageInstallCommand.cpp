@@ -3,7 +3,7 @@
 #include "gameactions/ServiceCommands.h"
 #include "i18n/modLocalizer.h"
 #include "support/PathFunctions.h"
-#include "support/SpecialFolders.h"
+#include "support/SystemFolders.h"
 #include "support/UserPrompt.h"
 #include "support/modShelAndWaitl.h"
 

@@ -90,8 +90,9 @@ void ChooseLanguageFile(const QString& path)
     LoadLanguageFile(path);
 }
 
-void InitLocalizer()
+void InitLocalizer(ChoiceStorage storage)
 {
+    const bool store = storage == ChoiceStorage::Store;
     const QString storedFile = FileNameOf(GetSetting(AppTitle(), kSection, kFileNameKey).trimmed());
     QString storedShortName = GetSetting(AppTitle(), kSection, kShortNameKey);
 
@@ -107,12 +108,15 @@ void InitLocalizer()
     for (const LanguageFileInfo& file : ListLanguageFiles()) {
         if (file.charset == systemCharset) {
             const QString shortName = ShortNameFromFileName(file.fileName);
-            StoreChoice(file.fileName, shortName);
+            if (store)
+                StoreChoice(file.fileName, shortName);
             LoadChosenFile(file.fileName, shortName);
             return;
         }
     }
     UseBuiltInLanguage();
+    if (!store)
+        return;
     if (storedFile.isEmpty())
         SaveSetting(AppTitle(), kSection, kFileNameKey, BuiltInLanguageName());
     if (storedShortName.isEmpty())

@@ -26,7 +26,9 @@ void UseBuiltInLanguage();
 
 // Program start: loads the stored language choice; without one, the first language file written for the
 // system's character set is chosen and stored. Call once, before the first window is shown.
-void InitLocalizer();
+// Commands that must not write anything pass ChoiceStorage::ReadOnly: the same language, nothing stored.
+enum class ChoiceStorage { Store, ReadOnly };
+void InitLocalizer(ChoiceStorage storage = ChoiceStorage::Store);
 
 // Stores the choice of a language file ("" for the built-in language) under "LocaleSettings", sets the
 // short name and loads the file. SwitchLanguage does this and then re-captions every open window.

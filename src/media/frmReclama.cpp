@@ -8,7 +8,7 @@
 #include "media/MediaKind.h"
 #include "media/ReclamaPicture.h"
 #include "store/CatalogueKeys.h"
-#include "support/SpecialFolders.h"
+#include "support/SystemFolders.h"
 #include "support/UserPrompt.h"
 
 #include <QAction>

@@ -1,7 +1,7 @@
 #include "store/DataFolders.h"
 
 #include "store/CatalogueKeys.h"
-#include "support/SpecialFolders.h"
+#include "support/SystemFolders.h"
 
 namespace Brimvault::DataFolders {
 

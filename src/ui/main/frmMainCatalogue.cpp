@@ -8,7 +8,7 @@
 #include "catalogue/IconCacheBuilder.h"
 #include "catalogue/ListBuilder.h"
 #include "support/PathFunctions.h"
-#include "support/SpecialFolders.h"
+#include "support/SystemFolders.h"
 #include "ui/listview/ImageCtrl.h"
 #include "ui/listview/ListElements.h"
 #include "ui/listview/SimpleListView.h"

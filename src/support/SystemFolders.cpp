@@ -1,4 +1,4 @@
-#include "support/SpecialFolders.h"
+#include "support/SystemFolders.h"
 
 #include "support/ProgramFolder.h"
 

@@ -1,4 +1,4 @@
-#include "support/SpecialFolders.h"
+#include "support/SystemFolders.h"
 
 #include "TestEnvironment.h"
 
@@ -8,7 +8,7 @@
 
 using namespace Brimvault;
 
-class tst_SpecialFolders : public QObject {
+class tst_SystemFolders : public QObject {
     Q_OBJECT
 
 private Q_SLOTS:
@@ -31,7 +31,7 @@ private:
     QString winePrefix() const { return m_env->path(QStringLiteral("wine")); }
 };
 
-void tst_SpecialFolders::init()
+void tst_SystemFolders::init()
 {
     m_env = std::make_unique<TestEnvironment>();
     QDir().mkpath(programDir());
@@ -40,14 +40,14 @@ void tst_SpecialFolders::init()
     qunsetenv("BRIMVAULT_WINVER");
 }
 
-void tst_SpecialFolders::cleanup()
+void tst_SystemFolders::cleanup()
 {
     qunsetenv("BRIMVAULT_PROGRAM_DIR");
     qunsetenv("WINEPREFIX");
     m_env.reset();
 }
 
-void tst_SpecialFolders::overriddenFolders_data()
+void tst_SystemFolders::overriddenFolders_data()
 {
     QTest::addColumn<int>("csidl");
     QTest::addColumn<QString>("suffix");
@@ -65,7 +65,7 @@ void tst_SpecialFolders::overriddenFolders_data()
         << CSIDL_COMMON_APPDATA << u"/Brimvault/"_qs << u"commonappdata/Brimvault/"_qs;
 }
 
-void tst_SpecialFolders::overriddenFolders()
+void tst_SystemFolders::overriddenFolders()
 {
     QFETCH(int, csidl);
     QFETCH(QString, suffix);
@@ -73,7 +73,7 @@ void tst_SpecialFolders::overriddenFolders()
     QCOMPARE(GetSpecialFolder(csidl, suffix), m_env->path(expected));
 }
 
-void tst_SpecialFolders::emptyFolderFallsBackToProgramFolder_data()
+void tst_SystemFolders::emptyFolderFallsBackToProgramFolder_data()
 {
     QTest::addColumn<int>("csidl");
     QTest::addColumn<QByteArray>("variable");
@@ -87,7 +87,7 @@ void tst_SpecialFolders::emptyFolderFallsBackToProgramFolder_data()
     QTest::newRow("unknown code") << 999 << QByteArray() << QByteArray();
 }
 
-void tst_SpecialFolders::emptyFolderFallsBackToProgramFolder()
+void tst_SystemFolders::emptyFolderFallsBackToProgramFolder()
 {
     QFETCH(int, csidl);
     QFETCH(QByteArray, variable);
@@ -100,7 +100,7 @@ void tst_SpecialFolders::emptyFolderFallsBackToProgramFolder()
     QCOMPARE(GetSpecialFolder(csidl, u"\\Brimvault\\"_qs), programDir());
 }
 
-void tst_SpecialFolders::standardLocationsWithoutOverride()
+void tst_SystemFolders::standardLocationsWithoutOverride()
 {
     qunsetenv("BRIMVAULT_COMMON_APPDATA");
     qunsetenv("BRIMVAULT_PERSONAL");
@@ -112,7 +112,7 @@ void tst_SpecialFolders::standardLocationsWithoutOverride()
     QCOMPARE(SpecialFolderPath(CSIDL_PERSONAL), documents);
 }
 
-void tst_SpecialFolders::programFilesFromWinePrefix()
+void tst_SystemFolders::programFilesFromWinePrefix()
 {
     qunsetenv("BRIMVAULT_PROGRAM_FILES");
     QCOMPARE(SpecialFolderPath(CSIDL_PROGRAM_FILES), QString());
@@ -124,7 +124,7 @@ void tst_SpecialFolders::programFilesFromWinePrefix()
     QCOMPARE(GetSpecialFolder(CSIDL_PROGRAM_FILES, u"\\Microsoft Games"_qs), programFiles + u"/Microsoft Games"_qs);
 }
 
-void tst_SpecialFolders::windowsFolder()
+void tst_SystemFolders::windowsFolder()
 {
     QCOMPARE(WindowsFolder(), m_env->path(QStringLiteral("windows")));
 
@@ -135,7 +135,7 @@ void tst_SpecialFolders::windowsFolder()
     QCOMPARE(WindowsFolder(), wineWindows);
 }
 
-void tst_SpecialFolders::winVerOverride_data()
+void tst_SystemFolders::winVerOverride_data()
 {
     QTest::addColumn<QByteArray>("value");
     QTest::addColumn<int>("expected");
@@ -148,7 +148,7 @@ void tst_SpecialFolders::winVerOverride_data()
     QTest::newRow("not a number") << "seven"_qba << 10;
 }
 
-void tst_SpecialFolders::winVerOverride()
+void tst_SystemFolders::winVerOverride()
 {
     QFETCH(QByteArray, value);
     QFETCH(int, expected);
@@ -157,7 +157,7 @@ void tst_SpecialFolders::winVerOverride()
     QCOMPARE(ReadMajorWinVerNumber(), expected);
 }
 
-void tst_SpecialFolders::winVerIsCachedAfterFirstCall()
+void tst_SystemFolders::winVerIsCachedAfterFirstCall()
 {
     // The only call of the cached lookup in this process.
     qputenv("BRIMVAULT_WINVER", "5");
@@ -167,5 +167,5 @@ void tst_SpecialFolders::winVerIsCachedAfterFirstCall()
     QCOMPARE(GetMajorWinVerNumber(), 5);
 }
 
-QTEST_GUILESS_MAIN(tst_SpecialFolders)
-#include "tst_specialfolders.moc"
+QTEST_GUILESS_MAIN(tst_SystemFolders)
+#include "tst_systemfolders.moc"
