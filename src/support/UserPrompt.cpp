@@ -5,16 +5,16 @@
 namespace Brimvault {
 
 namespace {
-    PromptHandler& promptHandler()
-    {
-        static PromptHandler handler;
-        return handler;
-    }
-    InputHandler& inputHandler()
-    {
-        static InputHandler handler;
-        return handler;
-    }
+PromptHandler& promptHandler()
+{
+    static PromptHandler handler;
+    return handler;
+}
+InputHandler& inputHandler()
+{
+    static InputHandler handler;
+    return handler;
+}
 } // namespace
 
 void SetPromptHandler(PromptHandler handler)

@@ -13,7 +13,7 @@ public:
     {
         Q_ASSERT(m_root.isValid());
         m_root.setAutoRemove(true);
-        for (const char* sub : { "settings", "commonappdata", "personal", "programfiles", "windows" })
+        for (const char* sub : {"settings", "commonappdata", "personal", "programfiles", "windows"})
             QDir(m_root.path()).mkpath(QString::fromLatin1(sub));
         qputenv("BRIMVAULT_SETTINGS_DIR", path(QStringLiteral("settings")).toLocal8Bit());
         qputenv("BRIMVAULT_COMMON_APPDATA", path(QStringLiteral("commonappdata")).toLocal8Bit());
