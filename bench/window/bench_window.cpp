@@ -1,0 +1,148 @@
+// The main window over generated libraries of 1,000 and 10,000 installed games (each in its own folder with
+// a real executable, an info file and a cached icon): from construction to the list filled with every icon
+// shown, and the process's resident memory with the larger library on screen.
+#include "catalogue/IconCacheKey.h"
+#include "icons/cFileIcon.h"
+#include "store/DataFolders.h"
+#include "store/clsFileBag.h"
+#include "ui/listview/ListElements.h"
+#include "ui/listview/SimpleListView.h"
+#include "ui/main/frmMain.h"
+
+#include <QApplication>
+#include <QDir>
+#include <QElapsedTimer>
+#include <QEventLoop>
+#include <QFile>
+#include <QTemporaryDir>
+#include <QTextStream>
+#include <QTimer>
+
+#include <memory>
+
+using namespace Brimvault;
+
+namespace {
+
+void figure(const QString& name, double value, const char* unit)
+{
+    QTextStream(stdout) << "figure " << name << ' ' << value << ' ' << unit << Qt::endl;
+}
+
+bool writeBytes(const QString& path, const QByteArray& bytes)
+{
+    QFile file(path);
+    return file.open(QIODevice::WriteOnly) && file.write(bytes) == bytes.size();
+}
+
+bool makeGame(const QString& folder, const QString& title, const QByteArray& exe, const QByteArray& icon)
+{
+    if (!QDir().mkpath(folder))
+        return false;
+    const QString path = folder + u'/' + title + QStringLiteral(".exe");
+    clsFileBag info;
+    info.SetRecord(clsFileBag::MakeKey(QStringLiteral("Name")), QStringLiteral("Game ") + title);
+    info.SetCurrentFileName(folder + u'/' + title + QStringLiteral(".bvxinf"));
+    return writeBytes(path, exe) && info.SaveFile()
+        && writeBytes(IconCacheFile(DataFolders::IconsFolder(), path), icon);
+}
+
+bool makeLibrary(const QString& root, int installed, const QByteArray& exe, const QByteArray& icon)
+{
+    for (const char* sub :
+        {"settings", "commonappdata/Brimvault/Icons", "personal", "program", "windows", "programfiles"})
+        QDir(root).mkpath(QString::fromLatin1(sub));
+    qputenv("BRIMVAULT_SETTINGS_DIR", (root + QStringLiteral("/settings")).toLocal8Bit());
+    qputenv("BRIMVAULT_COMMON_APPDATA", (root + QStringLiteral("/commonappdata")).toLocal8Bit());
+    qputenv("BRIMVAULT_PERSONAL", (root + QStringLiteral("/personal")).toLocal8Bit());
+    qputenv("BRIMVAULT_PROGRAM_DIR", (root + QStringLiteral("/program")).toLocal8Bit());
+    qputenv("BRIMVAULT_PROGRAM_FILES", (root + QStringLiteral("/programfiles")).toLocal8Bit());
+    qputenv("windir", (root + QStringLiteral("/windows")).toLocal8Bit());
+    qputenv("BRIMVAULT_CATALOGUE_ROOT", "http://127.0.0.1:9");
+
+    const QString games = DataFolders::GamesFolder();
+    for (int i = 0; i < installed; ++i) {
+        if (!makeGame(games + QStringLiteral("Game %1").arg(i), QStringLiteral("game%1").arg(i), exe, icon))
+            return false;
+    }
+    return true;
+}
+
+double residentMegabytes()
+{
+    QFile status(QStringLiteral("/proc/self/status"));
+    if (!status.open(QIODevice::ReadOnly))
+        return -1;
+    for (const QByteArray& line : status.readAll().split('\n')) {
+        if (line.startsWith("VmRSS:"))
+            return line.mid(6).trimmed().split(' ').value(0).toDouble() / 1024.0;
+    }
+    return -1;
+}
+
+// Milliseconds from construction until discovery has filled the list and no icon waits; -1 when it did not
+// get there within a minute.
+double fillWindow(int installed, double* rssMegabytes)
+{
+    QElapsedTimer timer;
+    timer.start();
+    auto window = std::make_unique<frmMain>();
+    bool rebuilt = false;
+    QObject::connect(window.get(), &frmMain::listRebuilt, window.get(), [&rebuilt] { rebuilt = true; });
+    window->show();
+    while (!(rebuilt && window->pendingIcons() == 0) && timer.elapsed() < 60000)
+        QCoreApplication::processEvents(QEventLoop::WaitForMoreEvents | QEventLoop::AllEvents, 50);
+    const double elapsed = double(timer.nsecsElapsed()) / 1e6;
+    // The list also holds the entry for more games on line; count only the generated ones.
+    int items = 0;
+    for (int i = 0; i < window->ListView1()->layoutState().itemCount; ++i)
+        items += window->ListView1()->labN(i).text().startsWith(QStringLiteral("Game game"));
+    if (!rebuilt || window->pendingIcons() != 0 || items != installed) {
+        QTextStream(stderr) << "window listed " << items << " of " << installed << " games, " << window->pendingIcons()
+                            << " icons pending\n";
+        return -1;
+    }
+    if (rssMegabytes)
+        *rssMegabytes = residentMegabytes();
+    window.reset();
+    QCoreApplication::processEvents();
+    return elapsed;
+}
+
+} // namespace
+
+int main(int argc, char** argv)
+{
+    QApplication app(argc, argv);
+    QFile fixture(QStringLiteral(BENCH_PE_FIXTURE));
+    cFileIcon icon;
+    if (!fixture.open(QIODevice::ReadOnly) || !icon.LoadMainIconFromEXE(fixture.fileName())) {
+        QTextStream(stderr) << "PE fixture missing: " << fixture.fileName() << '\n';
+        return 1;
+    }
+    const QByteArray exe = fixture.readAll();
+    const QByteArray iconBytes = icon.toIconFile();
+    QList<int> sizes;
+    for (const QString& argument : app.arguments().mid(1))
+        sizes.append(argument.toInt());
+    if (sizes.isEmpty())
+        sizes = {1000, 10000};
+    int failures = 0;
+    for (int installed : std::as_const(sizes)) {
+        QTemporaryDir root;
+        if (!makeLibrary(root.path(), installed, exe, iconBytes)) {
+            QTextStream(stderr) << "could not build the library of " << installed << " games\n";
+            return 1;
+        }
+        double rss = -1;
+        const double fill = fillWindow(installed, &rss);
+        if (fill < 0) {
+            ++failures;
+            continue;
+        }
+        figure(QStringLiteral("window_fill_%1").arg(installed), fill, "ms");
+        if (installed == 10000)
+            figure(QStringLiteral("window_rss_10000"), rss, "MB");
+    }
+    return failures == 0 ? 0 : 1;
+}
