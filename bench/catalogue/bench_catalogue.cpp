@@ -1,6 +1,7 @@
 // Discovery on generated libraries of 1,000 and 10,000 installed games (each in its own folder with a real
 // executable, an info file and a cached icon) plus 1,000 games added by hand. The folder walk is measured
 // beside `find` over the same tree; the listing command from process start to exit.
+#include "BenchLibrary.h"
 #include "catalogue/CatalogueListing.h"
 #include "catalogue/CatalogueLocations.h"
 #include "catalogue/GameDiscovery.h"
@@ -24,83 +25,11 @@
 #include <vector>
 
 using namespace Brimvault;
+using namespace Brimvault::BenchLibrary;
 
 namespace {
 
 constexpr int AddedByHand = 1000;
-
-double medianMilliseconds(int runs, const std::function<void()>& work)
-{
-    std::vector<double> times;
-    for (int run = 0; run < runs; ++run) {
-        QElapsedTimer timer;
-        timer.start();
-        work();
-        times.push_back(double(timer.nsecsElapsed()) / 1e6);
-    }
-    std::sort(times.begin(), times.end());
-    return times[times.size() / 2];
-}
-
-void figure(const QString& name, double value, const char* unit)
-{
-    QTextStream(stdout) << "figure " << name << ' ' << value << ' ' << unit << Qt::endl;
-}
-
-void ratio(const QString& name, double ours, double reference)
-{
-    QTextStream(stdout) << "ratio " << name << ' ' << ours / reference << Qt::endl;
-}
-
-bool writeBytes(const QString& path, const QByteArray& bytes)
-{
-    QFile file(path);
-    return file.open(QIODevice::WriteOnly) && file.write(bytes) == bytes.size();
-}
-
-// One game: its folder, the executable, the info file and the cached icon.
-bool makeGame(const QString& folder, const QString& title, const QByteArray& exe, const QByteArray& icon)
-{
-    if (!QDir().mkpath(folder))
-        return false;
-    const QString path = folder + u'/' + title + QStringLiteral(".exe");
-    clsFileBag info;
-    info.SetRecord(clsFileBag::MakeKey(QStringLiteral("Name")), QStringLiteral("Game ") + title);
-    info.SetCurrentFileName(folder + u'/' + title + QStringLiteral(".bvxinf"));
-    return writeBytes(path, exe) && info.SaveFile()
-        && writeBytes(IconCacheFile(DataFolders::IconsFolder(), path), icon);
-}
-
-bool makeLibrary(const QString& root, int installed, const QByteArray& exe, const QByteArray& icon)
-{
-    for (const char* sub : {"settings", "commonappdata/Brimvault/Icons", "program", "windows", "programfiles"})
-        QDir(root).mkpath(QString::fromLatin1(sub));
-    qputenv("BRIMVAULT_SETTINGS_DIR", (root + QStringLiteral("/settings")).toLocal8Bit());
-    qputenv("BRIMVAULT_COMMON_APPDATA", (root + QStringLiteral("/commonappdata")).toLocal8Bit());
-    qputenv("BRIMVAULT_PROGRAM_DIR", (root + QStringLiteral("/program")).toLocal8Bit());
-    qputenv("BRIMVAULT_PROGRAM_FILES", (root + QStringLiteral("/programfiles")).toLocal8Bit());
-    qputenv("windir", (root + QStringLiteral("/windows")).toLocal8Bit());
-    qputenv("WINEPREFIX", (root + QStringLiteral("/wine")).toLocal8Bit());
-    qputenv("BRIMVAULT_CATALOGUE_ROOT", "http://127.0.0.1:9");
-
-    const QString games = DataFolders::GamesFolder();
-    for (int i = 0; i < installed; ++i) {
-        const QString title = QStringLiteral("game%1").arg(i);
-        if (!makeGame(games + QStringLiteral("Game %1").arg(i), title, exe, icon))
-            return false;
-    }
-    QByteArray settings = "[Files]\nCount=" + QByteArray::number(AddedByHand) + '\n';
-    for (int i = 0; i < AddedByHand; ++i) {
-        const QString folder = root + QStringLiteral("/added/Added %1").arg(i);
-        const QString title = QStringLiteral("added%1").arg(i);
-        if (!makeGame(folder, title, exe, icon))
-            return false;
-        settings += "File" + QByteArray::number(i + 1) + '=' + (folder + u'/' + title + u".exe").toUtf8() + '\n';
-    }
-    settings += "[LocaleSettings]\nLngFileName=English (Default)\nLngNik=ENG\n";
-    return writeBytes(SettingsFilePath(AppTitle()), settings)
-        && GetAllSettings(AppTitle(), QStringLiteral("Files")).size() == AddedByHand + 1;
-}
 
 qsizetype runFind(const QString& folder)
 {
@@ -121,7 +50,7 @@ qsizetype runListCommand()
 void measure(int installed, const QByteArray& exe, const QByteArray& icon)
 {
     QTemporaryDir root;
-    if (!makeLibrary(root.path(), installed, exe, icon)) {
+    if (!makeLibrary(root.path(), installed, AddedByHand, exe, icon)) {
         QTextStream(stderr) << "could not build the library of " << installed << " games\n";
         return;
     }

@@ -1,6 +1,7 @@
 // The main window over generated libraries of 1,000 and 10,000 installed games (each in its own folder with
 // a real executable, an info file and a cached icon): from construction to the list filled with every icon
 // shown, and the process's resident memory with the larger library on screen.
+#include "BenchLibrary.h"
 #include "catalogue/IconCacheKey.h"
 #include "icons/cFileIcon.h"
 #include "store/DataFolders.h"
@@ -21,52 +22,12 @@
 #include <memory>
 
 using namespace Brimvault;
+using namespace Brimvault::BenchLibrary;
 
 namespace {
 
-void figure(const QString& name, double value, const char* unit)
-{
-    QTextStream(stdout) << "figure " << name << ' ' << value << ' ' << unit << Qt::endl;
-}
-
-bool writeBytes(const QString& path, const QByteArray& bytes)
-{
-    QFile file(path);
-    return file.open(QIODevice::WriteOnly) && file.write(bytes) == bytes.size();
-}
-
-bool makeGame(const QString& folder, const QString& title, const QByteArray& exe, const QByteArray& icon)
-{
-    if (!QDir().mkpath(folder))
-        return false;
-    const QString path = folder + u'/' + title + QStringLiteral(".exe");
-    clsFileBag info;
-    info.SetRecord(clsFileBag::MakeKey(QStringLiteral("Name")), QStringLiteral("Game ") + title);
-    info.SetCurrentFileName(folder + u'/' + title + QStringLiteral(".bvxinf"));
-    return writeBytes(path, exe) && info.SaveFile()
-        && writeBytes(IconCacheFile(DataFolders::IconsFolder(), path), icon);
-}
-
-bool makeLibrary(const QString& root, int installed, const QByteArray& exe, const QByteArray& icon)
-{
-    for (const char* sub :
-        {"settings", "commonappdata/Brimvault/Icons", "personal", "program", "windows", "programfiles"})
-        QDir(root).mkpath(QString::fromLatin1(sub));
-    qputenv("BRIMVAULT_SETTINGS_DIR", (root + QStringLiteral("/settings")).toLocal8Bit());
-    qputenv("BRIMVAULT_COMMON_APPDATA", (root + QStringLiteral("/commonappdata")).toLocal8Bit());
-    qputenv("BRIMVAULT_PERSONAL", (root + QStringLiteral("/personal")).toLocal8Bit());
-    qputenv("BRIMVAULT_PROGRAM_DIR", (root + QStringLiteral("/program")).toLocal8Bit());
-    qputenv("BRIMVAULT_PROGRAM_FILES", (root + QStringLiteral("/programfiles")).toLocal8Bit());
-    qputenv("windir", (root + QStringLiteral("/windows")).toLocal8Bit());
-    qputenv("BRIMVAULT_CATALOGUE_ROOT", "http://127.0.0.1:9");
-
-    const QString games = DataFolders::GamesFolder();
-    for (int i = 0; i < installed; ++i) {
-        if (!makeGame(games + QStringLiteral("Game %1").arg(i), QStringLiteral("game%1").arg(i), exe, icon))
-            return false;
-    }
-    return true;
-}
+// As in the catalogue benchmark: a thousand games added by hand beside the installed ones.
+constexpr int AddedByHand = 1000;
 
 double residentMegabytes()
 {
@@ -130,7 +91,7 @@ int main(int argc, char** argv)
     int failures = 0;
     for (int installed : std::as_const(sizes)) {
         QTemporaryDir root;
-        if (!makeLibrary(root.path(), installed, exe, iconBytes)) {
+        if (!makeLibrary(root.path(), installed, AddedByHand, exe, iconBytes)) {
             QTextStream(stderr) << "could not build the library of " << installed << " games\n";
             return 1;
         }
