@@ -92,20 +92,12 @@ void measure(int installed, const QByteArray& exe, const QByteArray& icon)
 int main(int argc, char** argv)
 {
     QGuiApplication app(argc, argv);
-    QFile fixture(QStringLiteral(BENCH_PE_FIXTURE));
-    cFileIcon icon;
-    if (!fixture.open(QIODevice::ReadOnly) || !icon.LoadMainIconFromEXE(fixture.fileName())) {
-        QTextStream(stderr) << "PE fixture missing: " << fixture.fileName() << '\n';
+    const std::optional<GameFiles> files = loadGameFiles(QStringLiteral(BENCH_PE_FIXTURE));
+    if (!files)
         return 1;
-    }
-    const QByteArray exe = fixture.readAll();
-    const QByteArray iconBytes = icon.toIconFile();
-    // Library sizes may be given on the command line, for profiling one of them.
-    QList<int> sizes;
-    for (const QString& argument : app.arguments().mid(1))
-        sizes.append(argument.toInt());
-    if (sizes.isEmpty())
-        sizes = {1000, 10000};
+    const QByteArray& exe = files->exe;
+    const QByteArray& iconBytes = files->icon;
+    const QList<int> sizes = librarySizes(app.arguments().mid(1));
     for (int installed : std::as_const(sizes))
         measure(installed, exe, iconBytes);
     return 0;

@@ -1,6 +1,7 @@
 #include "BenchLibrary.h"
 
 #include "catalogue/IconCacheKey.h"
+#include "icons/cFileIcon.h"
 #include "store/DataFolders.h"
 #include "store/SettingsStore.h"
 #include "store/clsFileBag.h"
@@ -59,6 +60,27 @@ bool writeBytes(const QString& path, const QByteArray& bytes)
 {
     QFile file(path);
     return file.open(QIODevice::WriteOnly) && file.write(bytes) == bytes.size();
+}
+
+std::optional<GameFiles> loadGameFiles(const QString& peFixture)
+{
+    QFile fixture(peFixture);
+    cFileIcon icon;
+    if (!fixture.open(QIODevice::ReadOnly) || !icon.LoadMainIconFromEXE(fixture.fileName())) {
+        QTextStream(stderr) << "PE fixture missing: " << fixture.fileName() << '\n';
+        return std::nullopt;
+    }
+    return GameFiles {fixture.readAll(), icon.toIconFile()};
+}
+
+QList<int> librarySizes(const QStringList& arguments)
+{
+    QList<int> sizes;
+    for (const QString& argument : arguments)
+        sizes.append(argument.toInt());
+    if (sizes.isEmpty())
+        sizes = {1000, 10000};
+    return sizes;
 }
 
 bool makeLibrary(const QString& root, int installed, int addedByHand, const QByteArray& exe, const QByteArray& icon)

@@ -1,9 +1,12 @@
 #pragma once
 
 #include <QByteArray>
+#include <QList>
 #include <QString>
+#include <QStringList>
 
 #include <functional>
+#include <optional>
 
 // What the catalogue and window benchmarks share: their output lines and the generated game libraries.
 namespace Brimvault::BenchLibrary {
@@ -16,6 +19,17 @@ bool writeBytes(const QString& path, const QByteArray& bytes);
 // Points every location of the program at root, then writes `installed` games into the games folder (each in
 // its own folder with the executable, an info file and a cached icon) and `addedByHand` games recorded in
 // the settings store.
+// The executable and its main icon file that every generated game is made of; nothing when the PE fixture
+// is missing (the reason goes to standard error).
+struct GameFiles {
+    QByteArray exe;
+    QByteArray icon;
+};
+std::optional<GameFiles> loadGameFiles(const QString& peFixture);
+
+// Library sizes given on the command line (for profiling one of them), else 1,000 and 10,000.
+QList<int> librarySizes(const QStringList& arguments);
+
 bool makeLibrary(const QString& root, int installed, int addedByHand, const QByteArray& exe, const QByteArray& icon);
 
 } // namespace Brimvault::BenchLibrary

@@ -75,19 +75,12 @@ double fillWindow(int installed, double* rssMegabytes)
 int main(int argc, char** argv)
 {
     QApplication app(argc, argv);
-    QFile fixture(QStringLiteral(BENCH_PE_FIXTURE));
-    cFileIcon icon;
-    if (!fixture.open(QIODevice::ReadOnly) || !icon.LoadMainIconFromEXE(fixture.fileName())) {
-        QTextStream(stderr) << "PE fixture missing: " << fixture.fileName() << '\n';
+    const std::optional<GameFiles> files = loadGameFiles(QStringLiteral(BENCH_PE_FIXTURE));
+    if (!files)
         return 1;
-    }
-    const QByteArray exe = fixture.readAll();
-    const QByteArray iconBytes = icon.toIconFile();
-    QList<int> sizes;
-    for (const QString& argument : app.arguments().mid(1))
-        sizes.append(argument.toInt());
-    if (sizes.isEmpty())
-        sizes = {1000, 10000};
+    const QByteArray& exe = files->exe;
+    const QByteArray& iconBytes = files->icon;
+    const QList<int> sizes = librarySizes(app.arguments().mid(1));
     int failures = 0;
     for (int installed : std::as_const(sizes)) {
         QTemporaryDir root;
