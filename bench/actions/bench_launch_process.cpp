@@ -1,5 +1,6 @@
 // From a launch call on a list item to the game's process running (it has written its record), against
 // starting the same program directly with QProcess::startDetached in the same folder.
+#include "BenchReport.h"
 #include "gameactions/GameLauncher.h"
 
 #include <QCoreApplication>
@@ -17,6 +18,7 @@
 #include <vector>
 
 using namespace Brimvault;
+using namespace Brimvault::BenchReport;
 
 namespace {
 
@@ -40,22 +42,6 @@ Timing measure(const QString& record, const std::function<void()>& launch)
         QThread::usleep(50);
     timing.runningMs = double(clock.nsecsElapsed()) / 1e6;
     return timing;
-}
-
-double median(std::vector<double> values)
-{
-    std::sort(values.begin(), values.end());
-    return values[values.size() / 2];
-}
-
-void figure(const char* name, double value, const char* unit)
-{
-    QTextStream(stdout) << "figure " << name << ' ' << value << ' ' << unit << Qt::endl;
-}
-
-void ratio(const char* name, double ours, double reference)
-{
-    QTextStream(stdout) << "ratio " << name << ' ' << ours / reference << Qt::endl;
 }
 
 } // namespace

@@ -1,5 +1,6 @@
 // From asking the media host to play a Flash movie to Ruffle reporting the movie's metadata, against the
 // floor of that path: the same host window loading a plain local page.
+#include "BenchReport.h"
 #include "SwfBuilder.h"
 
 #include "media/WebEngineStartup.h"
@@ -20,6 +21,7 @@
 #include <cstdio>
 
 using namespace Brimvault;
+using namespace Brimvault::BenchReport;
 
 namespace {
 
@@ -78,17 +80,6 @@ double measure(Start start, View view, const QString& ready)
     return elapsed;
 }
 
-double median(QList<double> values)
-{
-    std::sort(values.begin(), values.end());
-    return values.isEmpty() ? -1.0 : values.at(values.size() / 2);
-}
-
-void figure(const char* name, double value, const char* unit)
-{
-    std::printf("figure %s %.1f %s\n", name, value, unit);
-}
-
 } // namespace
 
 int main(int argc, char* argv[])
@@ -125,11 +116,11 @@ int main(int argc, char* argv[])
 
     // The first movie also starts the web engine and compiles Ruffle.
     const double cold = measure(playMovie, flashView, metadataReady);
-    QList<double> movieTimes;
-    QList<double> pageTimes;
+    std::vector<double> movieTimes;
+    std::vector<double> pageTimes;
     for (int run = 0; run < Runs; ++run) {
-        movieTimes.append(measure(playMovie, flashView, metadataReady));
-        pageTimes.append(measure(showPage, pageView, pageReady));
+        movieTimes.push_back(measure(playMovie, flashView, metadataReady));
+        pageTimes.push_back(measure(showPage, pageView, pageReady));
     }
     if (cold < 0 || std::any_of(movieTimes.cbegin(), movieTimes.cend(), [](double t) { return t < 0; })) {
         std::fprintf(stderr, "Ruffle did not report the movie's metadata (is Ruffle installed beside the program?)\n");
@@ -138,6 +129,6 @@ int main(int argc, char* argv[])
     figure("media_movie_metadata_first", cold, "ms");
     figure("media_movie_metadata_median", median(movieTimes), "ms");
     figure("media_plain_page_median", median(pageTimes), "ms");
-    std::printf("ratio media_movie_vs_plain_page %.2f\n", median(movieTimes) / median(pageTimes));
+    ratio("media_movie_vs_plain_page", median(movieTimes), median(pageTimes));
     return 0;
 }

@@ -1,5 +1,6 @@
 // The icon list beside Qt's QListView in icon mode, on the same captions and pictures: fill and show,
 // re-arrangement after a resize, one scroll step, and heap memory, for 1,000 and 20,000 games.
+#include "BenchReport.h"
 #include "ui/listview/SimpleListView.h"
 
 #include <QApplication>
@@ -17,6 +18,7 @@
 #include <vector>
 
 using namespace Brimvault;
+using namespace Brimvault::BenchReport;
 
 namespace {
 
@@ -73,12 +75,6 @@ std::vector<QPixmap> makePictures()
 size_t heapInUse()
 {
     return mallinfo2().uordblks;
-}
-
-double median(std::vector<double> values)
-{
-    std::sort(values.begin(), values.end());
-    return values[values.size() / 2];
 }
 
 void settle()
@@ -176,9 +172,10 @@ Figures measure(const Subject& subject, int count)
 
 void report(const char* name, int count, const char* unit, double ours, double reference)
 {
-    std::printf("figure %s_%d %.3f %s\n", name, count, ours, unit);
-    std::printf("figure %s_%d_qlistview %.3f %s\n", name, count, reference, unit);
-    std::printf("ratio %s_%d %.3f\n", name, count, reference > 0 ? ours / reference : 0.0);
+    const QString figureName = QString::fromLatin1(name) + u'_' + QString::number(count);
+    figure(figureName, ours, unit);
+    figure(figureName + QStringLiteral("_qlistview"), reference, unit);
+    ratio(figureName, ours, reference);
 }
 
 } // namespace

@@ -1,5 +1,6 @@
 // Installing a package of 1,000 files and 200 MB with the real service process, beside unzip extracting
 // the same archive in the same run. Both read a warm archive and write to the same file system.
+#include "BenchReport.h"
 #include "PackageWriter.h"
 
 #include <QCoreApplication>
@@ -17,22 +18,13 @@
 #include <vector>
 
 using namespace Brimvault;
+using namespace Brimvault::BenchReport;
 
 namespace {
 
 constexpr int Files = 1000;
 constexpr qint64 TotalBytes = qint64(200) * 1024 * 1024;
 constexpr int Runs = 5;
-
-void figure(const char* name, double value, const char* unit)
-{
-    QTextStream(stdout) << "figure " << name << ' ' << value << ' ' << unit << Qt::endl;
-}
-
-void ratio(const char* name, double ours, double reference)
-{
-    QTextStream(stdout) << "ratio " << name << ' ' << ours / reference << Qt::endl;
-}
 
 // Game data as it comes: about half already compressed (random), half repetitive tables and text.
 QByteArray fileContents(qint64 size, quint32 seed)
@@ -82,12 +74,6 @@ double timedRun(const QString& program, const QStringList& arguments, bool& ok)
     process.start(program, arguments);
     ok = process.waitForFinished(600000) && process.exitStatus() == QProcess::NormalExit && process.exitCode() == 0;
     return double(timer.nsecsElapsed()) / 1e6;
-}
-
-double median(std::vector<double> values)
-{
-    std::sort(values.begin(), values.end());
-    return values[values.size() / 2];
 }
 
 } // namespace

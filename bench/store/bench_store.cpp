@@ -1,6 +1,7 @@
 // Settings reads, record bag lookups and the added-games enumeration on a catalogue of realistic size.
 // The reference for a settings read is QSettings over the same INI file, opened per read as the program
 // reads (every read must see what the service wrote meanwhile).
+#include "BenchReport.h"
 #include "store/CatalogueStore.h"
 #include "store/SettingsStore.h"
 #include "store/clsFileBag.h"
@@ -16,6 +17,7 @@
 #include <vector>
 
 using namespace Brimvault;
+using namespace Brimvault::BenchReport;
 
 namespace {
 
@@ -32,16 +34,6 @@ double microsecondsPerCall(int calls, const std::function<void()>& call)
     }
     std::sort(runs.begin(), runs.end());
     return runs[runs.size() / 2];
-}
-
-void figure(const char* name, double value, const char* unit)
-{
-    QTextStream(stdout) << "figure " << name << ' ' << value << ' ' << unit << Qt::endl;
-}
-
-void ratio(const char* name, double ours, double reference)
-{
-    QTextStream(stdout) << "ratio " << name << ' ' << ours / reference << Qt::endl;
 }
 
 } // namespace
