@@ -12,6 +12,13 @@ namespace {
 
 constexpr quint32 RsrcRva = 0x1000;
 
+void put8(QByteArray& bytes, qint64 at, quint8 value)
+{
+    if (bytes.size() < at + 1)
+        bytes.resize(at + 1, '\0');
+    bytes[at] = char(value);
+}
+
 void put16(QByteArray& bytes, qint64 at, quint16 value)
 {
     if (bytes.size() < at + 2)
@@ -95,9 +102,9 @@ QByteArray validIconTree(qint64 padding = 0)
     // group: 0, 1, 1 image; entry 1 × 1, 2 colours, planes 1, 1 bit, 48 bytes, id 1
     put16(rsrc, 0xE0 + 2, 1);
     put16(rsrc, 0xE0 + 4, 1);
-    rsrc[0xE6] = 1;
-    rsrc[0xE7] = 1;
-    rsrc[0xE8] = 2;
+    put8(rsrc, 0xE6, 1);
+    put8(rsrc, 0xE7, 1);
+    put8(rsrc, 0xE8, 2);
     put16(rsrc, 0xEA, 1);
     put16(rsrc, 0xEC, 1);
     put32(rsrc, 0xEE, 48);
