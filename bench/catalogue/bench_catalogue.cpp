@@ -2,6 +2,7 @@
 // executable, an info file and a cached icon) plus 1,000 games added by hand. The folder walk is measured
 // beside `find` over the same tree; the listing command from process start to exit.
 #include "BenchLibrary.h"
+#include "BenchReport.h"
 #include "catalogue/CatalogueListing.h"
 #include "catalogue/CatalogueLocations.h"
 #include "catalogue/GameDiscovery.h"
@@ -26,6 +27,7 @@
 
 using namespace Brimvault;
 using namespace Brimvault::BenchLibrary;
+using namespace Brimvault::BenchReport;
 
 namespace {
 
@@ -50,7 +52,8 @@ qsizetype runListCommand()
 void measure(int installed, const QByteArray& exe, const QByteArray& icon)
 {
     QTemporaryDir root;
-    if (!makeLibrary(root.path(), installed, AddedByHand, exe, icon)) {
+    if (reusableLibrary(installed, AddedByHand, exe, icon).isEmpty()
+        && !makeLibrary(root.path(), installed, AddedByHand, exe, icon)) {
         QTextStream(stderr) << "could not build the library of " << installed << " games\n";
         return;
     }

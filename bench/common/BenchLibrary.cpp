@@ -33,29 +33,6 @@ bool makeGame(const QString& folder, const QString& title, const QByteArray& exe
 
 } // namespace
 
-void figure(const QString& name, double value, const char* unit)
-{
-    QTextStream(stdout) << "figure " << name << ' ' << value << ' ' << unit << Qt::endl;
-}
-
-void ratio(const QString& name, double ours, double reference)
-{
-    QTextStream(stdout) << "ratio " << name << ' ' << ours / reference << Qt::endl;
-}
-
-double medianMilliseconds(int runs, const std::function<void()>& work)
-{
-    std::vector<double> times;
-    for (int run = 0; run < runs; ++run) {
-        QElapsedTimer timer;
-        timer.start();
-        work();
-        times.push_back(double(timer.nsecsElapsed()) / 1e6);
-    }
-    std::sort(times.begin(), times.end());
-    return times[times.size() / 2];
-}
-
 bool writeBytes(const QString& path, const QByteArray& bytes)
 {
     QFile file(path);
@@ -83,11 +60,8 @@ QList<int> librarySizes(const QStringList& arguments)
     return sizes;
 }
 
-bool makeLibrary(const QString& root, int installed, int addedByHand, const QByteArray& exe, const QByteArray& icon)
+void pointAt(const QString& root)
 {
-    for (const char* sub :
-        {"settings", "commonappdata/Brimvault/Icons", "personal", "program", "windows", "programfiles"})
-        QDir(root).mkpath(QString::fromLatin1(sub));
     qputenv("BRIMVAULT_SETTINGS_DIR", (root + QStringLiteral("/settings")).toLocal8Bit());
     qputenv("BRIMVAULT_COMMON_APPDATA", (root + QStringLiteral("/commonappdata")).toLocal8Bit());
     qputenv("BRIMVAULT_PERSONAL", (root + QStringLiteral("/personal")).toLocal8Bit());
@@ -96,6 +70,14 @@ bool makeLibrary(const QString& root, int installed, int addedByHand, const QByt
     qputenv("windir", (root + QStringLiteral("/windows")).toLocal8Bit());
     qputenv("WINEPREFIX", (root + QStringLiteral("/wine")).toLocal8Bit());
     qputenv("BRIMVAULT_CATALOGUE_ROOT", "http://127.0.0.1:9");
+}
+
+bool makeLibrary(const QString& root, int installed, int addedByHand, const QByteArray& exe, const QByteArray& icon)
+{
+    for (const char* sub :
+        {"settings", "commonappdata/Brimvault/Icons", "personal", "program", "windows", "programfiles"})
+        QDir(root).mkpath(QString::fromLatin1(sub));
+    pointAt(root);
 
     const QString games = DataFolders::GamesFolder();
     for (int i = 0; i < installed; ++i) {
@@ -113,6 +95,23 @@ bool makeLibrary(const QString& root, int installed, int addedByHand, const QByt
     settings += "[LocaleSettings]\nLngFileName=English (Default)\nLngNik=ENG\n";
     return writeBytes(SettingsFilePath(AppTitle()), settings)
         && GetAllSettings(AppTitle(), QStringLiteral("Files")).size() == addedByHand + 1;
+}
+
+QString reusableLibrary(int installed, int addedByHand, const QByteArray& exe, const QByteArray& icon)
+{
+    const QString kept = qEnvironmentVariable("BRIMVAULT_BENCH_LIBRARIES");
+    if (kept.isEmpty())
+        return QString();
+    const QString root = kept + QStringLiteral("/library-%1-%2").arg(installed).arg(addedByHand);
+    const QString readyMark = root + QStringLiteral("/ready");
+    if (QFile::exists(readyMark)) {
+        pointAt(root);
+        return root;
+    }
+    QDir(root).removeRecursively();
+    if (!makeLibrary(root, installed, addedByHand, exe, icon) || !writeBytes(readyMark, QByteArray()))
+        return QString();
+    return root;
 }
 
 } // namespace Brimvault::BenchLibrary

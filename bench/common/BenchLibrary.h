@@ -8,12 +8,9 @@
 #include <functional>
 #include <optional>
 
-// What the catalogue and window benchmarks share: their output lines and the generated game libraries.
+// What the catalogue and window benchmarks share: the generated game libraries.
 namespace Brimvault::BenchLibrary {
 
-void figure(const QString& name, double value, const char* unit);
-void ratio(const QString& name, double ours, double reference);
-double medianMilliseconds(int runs, const std::function<void()>& work);
 bool writeBytes(const QString& path, const QByteArray& bytes);
 
 // Points every location of the program at root, then writes `installed` games into the games folder (each in
@@ -31,5 +28,12 @@ std::optional<GameFiles> loadGameFiles(const QString& peFixture);
 QList<int> librarySizes(const QStringList& arguments);
 
 bool makeLibrary(const QString& root, int installed, int addedByHand, const QByteArray& exe, const QByteArray& icon);
+
+// Points every location of the program at a library made before.
+void pointAt(const QString& root);
+
+// For repeated runs and profiling: with BRIMVAULT_BENCH_LIBRARIES set, the library is made once in a folder of
+// that name and used again by later runs; empty when the variable is not set or the library cannot be made.
+QString reusableLibrary(int installed, int addedByHand, const QByteArray& exe, const QByteArray& icon);
 
 } // namespace Brimvault::BenchLibrary

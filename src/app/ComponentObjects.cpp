@@ -1,6 +1,7 @@
 #include "app/ComponentObjects.h"
 
 #include "app/ComponentRegistry.h"
+#include "app/LibraryFileCheck.h"
 
 #include <QFileInfo>
 #include <QLibrary>
@@ -133,6 +134,8 @@ CreatedObject CreateObject(const QString& progId)
         return creationFailure(QStringLiteral("ActiveX component can't create object: ") + progId);
     if (!QFileInfo(libraryPath).isFile())
         return creationFailure(QStringLiteral("Component file not found: ") + libraryPath);
+    if (const std::optional<QString> problem = LibraryFileProblem(libraryPath))
+        return creationFailure(*problem);
 
     // Never unloaded: objects handed out keep running code from it.
     QLibrary library(libraryPath);

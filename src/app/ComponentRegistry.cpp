@@ -21,13 +21,15 @@ const QString& progIdSection()
     return section;
 }
 
-// Missing file → empty document; a file that exists but cannot be read → nothing.
+// Missing file → empty document; anything else in its place that cannot be read → nothing.
 std::optional<IniDocument> readRegistry(const QString& path)
 {
-    QFile file(path);
-    if (!file.exists())
+    const QFileInfo info(path);
+    if (!info.exists())
         return IniDocument();
-    if (!file.open(QIODevice::ReadOnly))
+    // A folder, a pipe or a device in the file's place is never read: a pipe would block the reader.
+    QFile file(path);
+    if (!info.isFile() || !file.open(QIODevice::ReadOnly))
         return std::nullopt;
     return IniDocument::parse(file.readAll());
 }

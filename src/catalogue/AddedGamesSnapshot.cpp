@@ -32,8 +32,12 @@ void AddedGamesSnapshot::read()
         noteAddedGame(key, value);
     }
     const auto names = GetAllSettings(AppTitle(), CatalogueKeys::FilesNamesSection);
-    for (const auto& [key, value] : names)
-        m_nameByKey.insert(key.toLower(), value);
+    // A key written twice by hand reads as the store reads it: the first one counts.
+    for (const auto& [key, value] : names) {
+        const QString lowerKey = key.toLower();
+        if (!m_nameByKey.contains(lowerKey))
+            m_nameByKey.insert(lowerKey, value);
+    }
 }
 
 QString AddedGamesSnapshot::userName(const QString& path) const

@@ -53,8 +53,9 @@ QList<GameEntry> GameAdder::AddGamesFromFolder(const QString& folder, const Entr
             const QString full = walked.path + name;
             if (GameFileRules::IsInstallerByVersion(full) || m_builder.IsGameListed(full))
                 continue;
-            ++count;
-            const QString key = CatalogueKeys::FileKeyPrefix + QString::number(count);
+            const int number = CatalogueStore::NextEntryNumber(count, m_builder.addedGames().games());
+            count = qMax(count, number);
+            const QString key = CatalogueKeys::FileKeyPrefix + QString::number(number);
             SaveSetting(AppTitle(), CatalogueKeys::FilesSection, key, full);
             m_builder.addedGames().noteAddedGame(key, full);
             added.append(m_builder.AddGameToList(full));

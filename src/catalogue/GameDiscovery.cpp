@@ -4,6 +4,7 @@
 #include "catalogue/GameEntry.h"
 #include "catalogue/GameFileRules.h"
 #include "catalogue/ListBuilder.h"
+#include "catalogue/ListedPaths.h"
 #include "catalogue/WindowsGames.h"
 #include "support/PathFunctions.h"
 
@@ -72,7 +73,7 @@ DiscoveryResult GameDiscovery::Run(const DiscoveryHooks& hooks)
 {
     DiscoveryResult result;
     m_builder.beginPass();
-    QString listedPaths;
+    ListedPaths listedPaths;
 
     // Each item is handed on, then the window may run its events, then the closing flag is looked at.
     const auto handOn = [&](const GameEntry& entry) {
@@ -94,18 +95,18 @@ DiscoveryResult GameDiscovery::Run(const DiscoveryHooks& hooks)
         hooks.clearList();
 
     const GameEntry online = m_builder.OnlineGamesEntry();
-    listedPaths += u'\t' + online.path.toUpper();
+    listedPaths.append(online.path.toUpper());
     if (!handOn(online))
         return result;
 
     for (const QString& path : installed) {
-        listedPaths += u'\t' + path.toUpper();
+        listedPaths.append(path.toUpper());
         if (!handOn(m_builder.AddGameToList(path)))
             return result;
     }
 
     for (const QString& path : WindowsGameFiles()) {
-        listedPaths += u'\t' + path.toUpper();
+        listedPaths.append(path.toUpper());
         if (!handOn(m_builder.AddGameToList(path)))
             return result;
     }
@@ -115,7 +116,7 @@ DiscoveryResult GameDiscovery::Run(const DiscoveryHooks& hooks)
     const auto addedGames = m_builder.addedGames().games();
     for (const auto& game : addedGames) {
         const QString path = game.path.trimmed();
-        if (listedPaths.contains(path.toUpper()))
+        if (listedPaths.containsPiece(path.toUpper()))
             continue;
         if (!handOn(m_builder.AddGameToList(path)))
             return result;

@@ -39,7 +39,8 @@ IconCacheBuilder::Result IconCacheBuilder::BuildIcon(const QString& path) const
     const QString cacheFile = FileSystemPath(result.cacheFile);
     try {
         cFileIcon cached;
-        if (!cacheFile.isEmpty() && cached.LoadIcon(cacheFile)) {
+        // Anything but a regular file in the cache file's place (a pipe would block the window) is no cache.
+        if (!cacheFile.isEmpty() && QFileInfo(cacheFile).isFile() && cached.LoadIcon(cacheFile)) {
             result.picture = cached.BestIconPicture();
             if (!result.picture.isNull()) {
                 result.outcome = Outcome::FromCache;
@@ -55,7 +56,10 @@ IconCacheBuilder::Result IconCacheBuilder::BuildIcon(const QString& path) const
     } catch (const NumberedError&) {
         return result;
     }
-    if (!cacheFile.isEmpty()) {
+    // Only a new or a regular file is written: a pipe in its place would block the window, and a link in the
+    // cache that all users share could point anywhere.
+    const QFileInfo existing(cacheFile);
+    if (!cacheFile.isEmpty() && !existing.isSymLink() && (!existing.exists() || existing.isFile())) {
         // Only the cache folder itself is made; its parent belongs to the installation.
         const QString folder = QFileInfo(cacheFile).absolutePath();
         if (!QFileInfo(folder).isDir())

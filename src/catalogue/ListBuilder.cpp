@@ -25,7 +25,8 @@ QString knownPathOf(const QString& path)
 // The picture of an icon file, null when the file is missing, unreadable or holds no usable image.
 QImage pictureOf(const QString& iconFile)
 {
-    if (iconFile.isEmpty())
+    // Only a regular file is read: a named pipe in the icon's place would block the window for good.
+    if (iconFile.isEmpty() || !QFileInfo(FileSystemPath(iconFile)).isFile())
         return {};
     try {
         cFileIcon icon;

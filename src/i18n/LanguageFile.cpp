@@ -3,6 +3,7 @@
 #include "i18n/LanguageEncoding.h"
 
 #include <QFile>
+#include <QFileInfo>
 #include <QList>
 #include <QStringView>
 #include <optional>
@@ -117,9 +118,12 @@ LanguageFileContent ParseLanguageFile(const QByteArray& bytes)
 LanguageFileContent ReadLanguageFile(const QString& path)
 {
     QFile file(path);
-    if (path.isEmpty() || !file.open(QIODevice::ReadOnly) || file.size() > kMaxLanguageFileSize)
+    // Only a regular file is opened: a named pipe in its place would block start-up for good.
+    if (path.isEmpty() || !QFileInfo(path).isFile() || !file.open(QIODevice::ReadOnly)
+        || file.size() > kMaxLanguageFileSize)
         return {};
-    const QByteArray bytes = file.read(kMaxLanguageFileSize + 1);
+    // What is there, not the largest size allowed: asking for that would allocate it for every small file.
+    const QByteArray bytes = file.read(file.size() + 1);
     if (bytes.size() > kMaxLanguageFileSize || file.error() != QFileDevice::NoError)
         return {};
     return ParseLanguageFile(bytes);

@@ -6,6 +6,9 @@
 #include <QBuffer>
 #include <QByteArray>
 #include <QImageReader>
+#include <QtEndian>
+
+#include <array>
 
 namespace Brimvault::IconImageDecoder {
 
@@ -14,13 +17,18 @@ using namespace detail;
 namespace {
 
 constexpr char PngSignature[] = "\x89PNG\r\n\x1a\n";
+constexpr QRgb Opaque = 0xFF000000u;
+constexpr QRgb MaskShows = 0xFFFFFFFFu; // white: the screen shows through
+constexpr QRgb MaskCovers = 0xFF000000u;
+
+enum class Wanted { All, Composed };
 
 qint64 rowBytes(qint64 bits)
 {
     return ((bits + 31) / 32) * 4;
 }
 
-Bitmaps decodePng(const QByteArray& image)
+Bitmaps decodePng(const QByteArray& image, Wanted wanted)
 {
     QBuffer buffer;
     buffer.setData(image);
@@ -33,18 +41,22 @@ Bitmaps decodePng(const QByteArray& image)
     if (!reader.read(&picture) || picture.isNull())
         return {};
     Bitmaps out;
-    out.composed = picture.convertToFormat(QImage::Format_ARGB32);
+    out.composed = std::move(picture).convertToFormat(QImage::Format_ARGB32);
+    if (wanted == Wanted::Composed)
+        return out;
     out.colour = out.composed.convertToFormat(QImage::Format_RGB32);
     out.mask = QImage(out.composed.size(), QImage::Format_RGB32);
     for (int y = 0; y < out.composed.height(); ++y) {
         const QRgb* src = reinterpret_cast<const QRgb*>(out.composed.constScanLine(y));
         QRgb* dst = reinterpret_cast<QRgb*>(out.mask.scanLine(y));
         for (int x = 0; x < out.composed.width(); ++x)
-            dst[x] = qAlpha(src[x]) < 128 ? qRgb(255, 255, 255) : qRgb(0, 0, 0);
+            dst[x] = qAlpha(src[x]) < 128 ? MaskShows : MaskCovers;
     }
     return out;
 }
 
+// Where the parts of a bitmap image lie. The pixel block (and the mask, when there is one) have been checked
+// to lie wholly inside the image, so rows are read from them without further tests.
 struct BitmapLayout {
     int width = 0;
     int height = 0;
@@ -52,10 +64,10 @@ struct BitmapLayout {
     int bitCount = 0;
     qint64 palette = 0; // offset of the palette
     qint64 paletteCount = 0;
-    qint64 colourBits = 0;
     qint64 colourRow = 0;
-    qint64 maskBits = 0;
     qint64 maskRow = 0;
+    QByteArrayView colourBlock;
+    QByteArrayView maskBlock; // empty when the image has no AND mask
 };
 
 std::optional<BitmapLayout> layoutOf(const ByteReader& reader)
@@ -94,86 +106,124 @@ std::optional<BitmapLayout> layoutOf(const ByteReader& reader)
     if (*compression != 0 && !(*compression == BmpBitFields && (layout.bitCount == 16 || layout.bitCount == 32)))
         return std::nullopt;
     layout.palette = qint64(*headerSize) + (*compression == BmpBitFields && *headerSize == BmpHeaderSize ? 12 : 0);
-    layout.colourBits = layout.palette + 4 * layout.paletteCount;
+    const qint64 colourBits = layout.palette + 4 * layout.paletteCount;
     layout.colourRow = rowBytes(qint64(layout.bitCount) * layout.width);
-    layout.maskBits = layout.colourBits + layout.colourRow * layout.height;
     layout.maskRow = rowBytes(layout.width);
-    if (!reader.contains(layout.colourBits, layout.colourRow * layout.height))
+    const auto colourBlock = reader.bytes(colourBits, layout.colourRow * layout.height);
+    if (!colourBlock)
         return std::nullopt;
+    layout.colourBlock = *colourBlock;
+    // An image without an AND mask is drawn opaque.
+    layout.maskBlock
+        = reader.bytes(colourBits + colourBlock->size(), layout.maskRow * layout.height).value_or(QByteArrayView());
     return layout;
 }
 
-QRgb paletteColour(const ByteReader& reader, const BitmapLayout& layout, quint32 index)
+// Indices past the palette's end are black, as are palette bytes past the image's end.
+std::array<QRgb, 256> paletteOf(const ByteReader& reader, const BitmapLayout& layout)
 {
-    if (index >= layout.paletteCount)
-        return qRgb(0, 0, 0);
-    const qint64 at = layout.palette + 4 * qint64(index);
-    return qRgb(reader.u8(at + 2).value_or(0), reader.u8(at + 1).value_or(0), reader.u8(at).value_or(0));
+    std::array<QRgb, 256> colours;
+    colours.fill(qRgb(0, 0, 0));
+    if (layout.bitCount > 8)
+        return colours;
+    const qint64 count = qMin<qint64>(layout.paletteCount, qint64(colours.size()));
+    for (qint64 i = 0; i < count; ++i) {
+        const qint64 at = layout.palette + 4 * i;
+        colours[std::size_t(i)]
+            = qRgb(reader.u8(at + 2).value_or(0), reader.u8(at + 1).value_or(0), reader.u8(at).value_or(0));
+    }
+    return colours;
 }
 
-// The colour of pixel x in a row; alpha is the stored byte for 32-bit images, else 255.
-QRgb pixelAt(const ByteReader& reader, const BitmapLayout& layout, qint64 row, int x)
+// One stored row of colour bits into pixels; alpha is the stored byte for 32-bit images, else 255.
+void decodeRow(const BitmapLayout& layout, const std::array<QRgb, 256>& palette, const uchar* row, QRgb* out)
 {
+    const int width = layout.width;
     switch (layout.bitCount) {
     case 1:
-        return paletteColour(reader, layout, (*reader.u8(row + x / 8) >> (7 - x % 8)) & 1);
+        for (int x = 0; x < width; ++x)
+            out[x] = palette[(row[x / 8] >> (7 - x % 8)) & 1];
+        return;
     case 4:
-        return paletteColour(reader, layout, (*reader.u8(row + x / 2) >> (x % 2 ? 0 : 4)) & 0xF);
+        for (int x = 0; x < width; ++x)
+            out[x] = palette[(row[x / 2] >> (x % 2 ? 0 : 4)) & 0xF];
+        return;
     case 8:
-        return paletteColour(reader, layout, *reader.u8(row + x));
-    case 16: {
-        const quint16 v = *reader.u16(row + 2 * qint64(x));
-        return qRgb(((v >> 10) & 0x1F) * 255 / 31, ((v >> 5) & 0x1F) * 255 / 31, (v & 0x1F) * 255 / 31);
-    }
+        for (int x = 0; x < width; ++x)
+            out[x] = palette[row[x]];
+        return;
+    case 16:
+        for (int x = 0; x < width; ++x) {
+            const quint16 v = qFromLittleEndian<quint16>(row + 2 * x);
+            out[x] = qRgb(((v >> 10) & 0x1F) * 255 / 31, ((v >> 5) & 0x1F) * 255 / 31, (v & 0x1F) * 255 / 31);
+        }
+        return;
     case 24:
-        return qRgb(
-            *reader.u8(row + 3 * qint64(x) + 2), *reader.u8(row + 3 * qint64(x) + 1), *reader.u8(row + 3 * qint64(x)));
+        for (int x = 0; x < width; ++x)
+            out[x] = qRgb(row[3 * x + 2], row[3 * x + 1], row[3 * x]);
+        return;
     default:
-        return qRgba(*reader.u8(row + 4 * qint64(x) + 2), *reader.u8(row + 4 * qint64(x) + 1),
-            *reader.u8(row + 4 * qint64(x)), *reader.u8(row + 4 * qint64(x) + 3));
+        // Blue, green, red, alpha in memory is QRgb read little-endian.
+        for (int x = 0; x < width; ++x)
+            out[x] = qFromLittleEndian<quint32>(row + 4 * x);
+        return;
     }
 }
 
-Bitmaps decodeBitmap(const QByteArray& image)
+Bitmaps decodeBitmap(const QByteArray& image, Wanted wanted)
 {
     const ByteReader reader {QByteArrayView(image)};
     const auto layout = layoutOf(reader);
     if (!layout)
         return {};
-    // An image without an AND mask is drawn opaque.
-    const bool hasMask = reader.contains(layout->maskBits, layout->maskRow * layout->height);
+    const bool hasMask = !layout->maskBlock.isEmpty();
+    const bool all = wanted == Wanted::All;
     Bitmaps out;
-    out.colour = QImage(layout->width, layout->height, QImage::Format_RGB32);
-    out.mask = QImage(layout->width, layout->height, QImage::Format_RGB32);
     out.composed = QImage(layout->width, layout->height, QImage::Format_ARGB32);
-    if (out.colour.isNull() || out.mask.isNull() || out.composed.isNull())
+    if (all) {
+        out.colour = QImage(layout->width, layout->height, QImage::Format_RGB32);
+        out.mask = QImage(layout->width, layout->height, QImage::Format_RGB32);
+    }
+    if (out.composed.isNull() || (all && (out.colour.isNull() || out.mask.isNull())))
         return {};
+    const std::array<QRgb, 256> palette = paletteOf(reader, *layout);
+    const auto* colourBits = reinterpret_cast<const uchar*>(layout->colourBlock.data());
+    const auto* maskBits = reinterpret_cast<const uchar*>(layout->maskBlock.data());
     bool anyAlpha = false;
     for (int y = 0; y < layout->height; ++y) {
         const int stored = layout->bottomUp ? layout->height - 1 - y : y;
-        const qint64 colourRow = layout->colourBits + layout->colourRow * stored;
-        const qint64 maskRow = layout->maskBits + layout->maskRow * stored;
-        QRgb* colour = reinterpret_cast<QRgb*>(out.colour.scanLine(y));
-        QRgb* mask = reinterpret_cast<QRgb*>(out.mask.scanLine(y));
         QRgb* composed = reinterpret_cast<QRgb*>(out.composed.scanLine(y));
+        decodeRow(*layout, palette, colourBits + layout->colourRow * stored, composed);
+        if (layout->bitCount == 32 && !anyAlpha) {
+            for (int x = 0; x < layout->width && !anyAlpha; ++x)
+                anyAlpha = qAlpha(composed[x]) != 0;
+        }
+        const uchar* maskRow = hasMask ? maskBits + layout->maskRow * stored : nullptr;
+        QRgb* colour = all ? reinterpret_cast<QRgb*>(out.colour.scanLine(y)) : nullptr;
+        QRgb* mask = all ? reinterpret_cast<QRgb*>(out.mask.scanLine(y)) : nullptr;
         for (int x = 0; x < layout->width; ++x) {
-            const QRgb pixel = pixelAt(reader, *layout, colourRow, x);
-            const bool transparent = hasMask && ((*reader.u8(maskRow + x / 8) >> (7 - x % 8)) & 1);
-            colour[x] = pixel | 0xFF000000u;
-            mask[x] = transparent ? qRgb(255, 255, 255) : qRgb(0, 0, 0);
-            anyAlpha = anyAlpha || (layout->bitCount == 32 && qAlpha(pixel) != 0);
+            const QRgb pixel = composed[x] | Opaque;
+            const bool transparent = maskRow && ((maskRow[x / 8] >> (7 - x % 8)) & 1);
+            if (all) {
+                colour[x] = pixel;
+                mask[x] = transparent ? MaskShows : MaskCovers;
+            }
             // Where the mask is set, the screen shows through; inverting it is not something a picture can hold.
-            composed[x] = transparent ? qRgba(0, 0, 0, 0) : (pixel | 0xFF000000u);
+            // Alpha pixels keep their stored value until we know whether the image uses alpha at all.
+            if (layout->bitCount != 32)
+                composed[x] = transparent ? qRgba(0, 0, 0, 0) : pixel;
         }
     }
     // A 32-bit image that carries alpha is drawn by its alpha, not its mask.
-    if (anyAlpha) {
+    if (layout->bitCount == 32 && !anyAlpha) {
         for (int y = 0; y < layout->height; ++y) {
             const int stored = layout->bottomUp ? layout->height - 1 - y : y;
-            const qint64 colourRow = layout->colourBits + layout->colourRow * stored;
+            const uchar* maskRow = hasMask ? maskBits + layout->maskRow * stored : nullptr;
             QRgb* composed = reinterpret_cast<QRgb*>(out.composed.scanLine(y));
-            for (int x = 0; x < layout->width; ++x)
-                composed[x] = pixelAt(reader, *layout, colourRow, x);
+            for (int x = 0; x < layout->width; ++x) {
+                const bool transparent = maskRow && ((maskRow[x / 8] >> (7 - x % 8)) & 1);
+                composed[x] = transparent ? qRgba(0, 0, 0, 0) : (composed[x] | Opaque);
+            }
         }
     }
     return out;
@@ -188,7 +238,12 @@ bool IsPng(const QByteArray& image)
 
 Bitmaps Decode(const QByteArray& image)
 {
-    return IsPng(image) ? decodePng(image) : decodeBitmap(image);
+    return IsPng(image) ? decodePng(image, Wanted::All) : decodeBitmap(image, Wanted::All);
+}
+
+QImage DecodePicture(const QByteArray& image)
+{
+    return (IsPng(image) ? decodePng(image, Wanted::Composed) : decodeBitmap(image, Wanted::Composed)).composed;
 }
 
 } // namespace Brimvault::IconImageDecoder

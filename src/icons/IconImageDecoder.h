@@ -19,6 +19,8 @@ struct Bitmaps {
 
 // Null images when the bytes do not hold a picture this decoder understands.
 Bitmaps Decode(const QByteArray& image);
+// The composed picture alone, as Decode gives it; cheaper when the separate bitmaps are not drawn.
+QImage DecodePicture(const QByteArray& image);
 
 bool IsPng(const QByteArray& image);
 

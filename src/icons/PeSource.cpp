@@ -21,7 +21,8 @@ std::unique_ptr<PeSource> PeSource::fromFile(const QString& path, int* platformE
 {
     std::unique_ptr<PeSource> source(new PeSource);
     source->m_file = std::make_unique<QFile>(path);
-    if (!source->m_file->open(QIODevice::ReadOnly)) {
+    // Only a regular file is opened: a named pipe in a game's place would block the window for good.
+    if (!QFileInfo(path).isFile() || !source->m_file->open(QIODevice::ReadOnly)) {
         *platformError = QFileInfo::exists(path) ? 5 : 2;
         return nullptr;
     }

@@ -19,6 +19,8 @@ constexpr quint32 CannotWrite = ObjectErrorBase + 1052;
 constexpr quint32 WriteFailed = ObjectErrorBase + 1053;
 // Far above any real icon image; keeps AddImage from asking for gigabytes.
 constexpr qint64 MaxAddedImageBytes = qint64(1) << 27;
+// What LoadIcon reads at once: the whole of a usual icon file.
+constexpr qint64 FirstReadSize = qint64(1) << 16;
 
 [[noreturn]] void raise(quint32 number, const QString& message)
 {
@@ -87,10 +89,18 @@ bool cFileIcon::LoadIcon(const QString& sFileName)
 {
     reset(sFileName);
     m_lastLoadMessage.clear();
+    // One read takes in the whole of a usual icon file; images beyond it are read on their own.
     QFile file(sFileName);
+    const bool opened = file.open(QIODevice::ReadOnly | QIODevice::Unbuffered);
+    const qint64 fileSize = opened ? file.size() : 0;
+    QByteArray bytes;
+    const auto readUpTo = [&](qint64 end) {
+        if (opened && end > bytes.size())
+            bytes += file.read(qMax(end, qMin(fileSize, FirstReadSize)) - bytes.size());
+    };
     // A file that cannot be opened reads as nothing: the zeroed header then fails the type test.
-    const QByteArray header = file.open(QIODevice::ReadOnly) ? file.read(IconHeaderSize) : QByteArray();
-    const ByteReader headerReader {QByteArrayView(header)};
+    readUpTo(IconHeaderSize);
+    const ByteReader headerReader {QByteArrayView(bytes)};
     m_idReserved = headerReader.u16(0).value_or(0);
     m_idType = headerReader.u16(2).value_or(0);
     m_idCount = qint16(headerReader.u16(4).value_or(0));
@@ -108,25 +118,28 @@ bool cFileIcon::LoadIcon(const QString& sFileName)
     }
 
     bool failed = false;
-    for (int i = 0; i < m_idCount && !failed; ++i) {
-        const QByteArray raw = file.read(IconDirEntrySize);
-        if (raw.size() < IconDirEntrySize) {
+    readUpTo(IconHeaderSize + IconDirEntrySize * m_idCount);
+    for (int i = 0; i < m_idCount; ++i) {
+        const qint64 at = IconHeaderSize + IconDirEntrySize * i;
+        if (bytes.size() < at + IconDirEntrySize) {
             m_lastLoadMessage = QStringLiteral("Icon Directory Array is Corrupt.");
             failed = true;
             break;
         }
-        m_entries.append(readEntry(ByteReader(QByteArrayView(raw)), 0));
+        m_entries.append(readEntry(ByteReader(QByteArrayView(bytes)), at));
     }
-    const qint64 fileSize = file.size();
     for (qsizetype i = 0; i < m_entries.size() && !failed; ++i) {
         const IconDirEntry& entry = m_entries.at(i);
         // Never ask for more than the file can hold: a size past its end is a short read anyway.
-        const bool fits = qint64(entry.dwImageOffset) <= fileSize
-            && qint64(entry.dwBytesInRes) <= fileSize - qint64(entry.dwImageOffset);
+        const qint64 offset = entry.dwImageOffset;
+        const qint64 size = entry.dwBytesInRes;
+        const bool fits = offset <= fileSize && size <= fileSize - offset;
         QByteArray image;
-        if (fits && file.seek(entry.dwImageOffset))
-            image = file.read(entry.dwBytesInRes);
-        if (!fits || image.size() < qint64(entry.dwBytesInRes)) {
+        if (fits && offset + size <= bytes.size())
+            image = bytes.sliced(offset, size);
+        else if (fits && file.seek(offset))
+            image = file.read(size);
+        if (!fits || image.size() < size) {
             m_lastLoadMessage = QStringLiteral("Icon Images Array is Corrupt.");
             failed = true;
             break;

@@ -77,7 +77,7 @@ QImage cFileIcon::IconHandle(int nIndex) const
 {
     if (nIndex < 1 || nIndex > m_images.size())
         return {};
-    return IconImageDecoder::Decode(m_images.at(nIndex - 1)).composed;
+    return IconImageDecoder::DecodePicture(m_images.at(nIndex - 1));
 }
 
 QImage cFileIcon::IconPicture(int nIndex) const

@@ -35,7 +35,15 @@ ReadResult readText(const QString& fileName)
     QFile file(info.filePath());
     if (!file.open(QIODevice::ReadOnly))
         return {ReadStatus::Unreadable, {}};
-    const QByteArray bytes = file.read(MaximumFileSize + 1);
+    // Asking for the largest size at once would allocate it for every small file; read what is there instead,
+    // and keep reading in case the file grew since it was looked at.
+    QByteArray bytes = file.read(info.size() + 1);
+    while (bytes.size() > info.size() && bytes.size() <= MaximumFileSize && file.error() == QFileDevice::NoError) {
+        const QByteArray more = file.read(qMin<qint64>(MaximumFileSize + 1 - bytes.size(), 1 << 20));
+        if (more.isEmpty())
+            break;
+        bytes += more;
+    }
     if (file.error() != QFileDevice::NoError || bytes.size() > MaximumFileSize)
         return {ReadStatus::Unreadable, {}};
     QStringDecoder decoder(QStringConverter::System, QStringConverter::Flag::Stateless);

@@ -3,6 +3,10 @@
 #include "store/CatalogueKeys.h"
 #include "store/SettingsStore.h"
 
+#include <QSet>
+
+#include <limits>
+
 namespace Brimvault::CatalogueStore {
 
 namespace {
@@ -41,15 +45,30 @@ int EntryCount()
     return ok && count > 0 ? count : 0;
 }
 
+int NextEntryNumber(int highest, const QList<AddedGame>& games)
+{
+    if (highest < std::numeric_limits<int>::max())
+        return qMax(highest, 0) + 1;
+    QSet<int> used;
+    for (const AddedGame& game : games)
+        used.insert(game.number());
+    int number = 1;
+    while (used.contains(number))
+        ++number;
+    return number;
+}
+
 QString AddGame(const QString& path)
 {
     // A counter lost or damaged by hand must not hand out a number that is still in use.
+    const QList<AddedGame> games = AddedGames();
     int highest = EntryCount();
-    for (const AddedGame& game : AddedGames())
+    for (const AddedGame& game : games)
         highest = qMax(highest, game.number());
-    const int number = highest + 1;
+    const int number = NextEntryNumber(highest, games);
     const QString key = CatalogueKeys::FileKeyPrefix + QString::number(number);
-    SaveSetting(AppTitle(), CatalogueKeys::FilesSection, CatalogueKeys::CountKey, QString::number(number));
+    SaveSetting(
+        AppTitle(), CatalogueKeys::FilesSection, CatalogueKeys::CountKey, QString::number(qMax(highest, number)));
     SaveSetting(AppTitle(), CatalogueKeys::FilesSection, key, path);
     return key;
 }

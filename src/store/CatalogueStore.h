@@ -46,6 +46,10 @@ void SetDisplayName(const QString& fileKey, const QString& name);
 // The highest entry number given out so far.
 int EntryCount();
 
+// The number to give out after `highest`: the next one up, or, once the largest number there is has been
+// given out (a counter edited by hand), the smallest one that none of `games` uses.
+int NextEntryNumber(int highest, const QList<AddedGame>& games);
+
 bool SamePath(const QString& a, const QString& b);
 
 } // namespace Brimvault::CatalogueStore

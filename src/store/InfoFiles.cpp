@@ -34,11 +34,9 @@ QString GameInfoFileName(const QString& gamePath)
 
 QString GameInfoName(const QString& gamePath, const QString& lngNik)
 {
-    const QString infoFile = GameInfoFileName(gamePath);
-    if (!BagFileIo::isFile(infoFile))
-        return QString();
+    // A missing info file, or a folder in its place, reads as an empty bag.
     clsFileBag bag;
-    bag.OpenFile(infoFile);
+    bag.OpenFile(GameInfoFileName(gamePath));
     const QString localised = recordValue(bag, CatalogueKeys::NameRecord + u'_' + lngNik);
     return localised.isEmpty() ? recordValue(bag, CatalogueKeys::NameRecord) : localised;
 }

@@ -43,6 +43,20 @@ PromptAnswer ShowPrompt(const PromptRequest& request)
     return PromptAnswer::Ok;
 }
 
+PromptAnswer CancellingAnswer(PromptButtons buttons)
+{
+    switch (buttons) {
+    case PromptButtons::Ok:
+        return PromptAnswer::Ok;
+    case PromptButtons::YesNo:
+        return PromptAnswer::No;
+    case PromptButtons::OkCancel:
+    case PromptButtons::YesNoCancel:
+        break;
+    }
+    return PromptAnswer::Cancel;
+}
+
 std::optional<QString> AskInput(const InputRequest& request)
 {
     if (inputHandler())

@@ -32,6 +32,10 @@ using InputHandler = std::function<std::optional<QString>(const InputRequest&)>;
 void SetPromptHandler(PromptHandler handler);
 void SetInputHandler(InputHandler handler);
 
+// The answer of a box closed without a click (Escape, the title bar): its cancelling button, No for Yes/No,
+// OK for a box that has only OK.
+PromptAnswer CancellingAnswer(PromptButtons buttons);
+
 // Without an installed handler the text goes to standard error and the first button is the answer.
 PromptAnswer ShowPrompt(const PromptRequest& request);
 std::optional<QString> AskInput(const InputRequest& request);

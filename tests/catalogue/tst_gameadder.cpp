@@ -24,6 +24,7 @@ private Q_SLOTS:
     void addFolderFilters();
     void addFolderRewritesCountWhenNothingAdded();
     void addFolderCountsFromTheHighestNumber();
+    void addFolderAfterTheLargestNumber();
     void addFolderSkipsListedGames();
     void installerByVersionText();
     void drop_data();
@@ -162,6 +163,25 @@ void TestGameAdder::addFolderCountsFromTheHighestNumber()
     QCOMPARE(setting(u"File6"_qs), root + u"/new.exe"_qs);
     QCOMPARE(setting(u"File5"_qs), env.path(QStringLiteral("old.exe")));
     QCOMPARE(setting(u"Count"_qs), u"6"_qs);
+}
+
+// A counter edited up to the largest number there is: the games take the free numbers, nothing is overwritten.
+void TestGameAdder::addFolderAfterTheLargestNumber()
+{
+    TestEnvironment env;
+    const QString root = env.path(QStringLiteral("tree"));
+    QVERIFY(writeFile(root + u"/one.exe"_qs));
+    QVERIFY(writeFile(root + u"/two.exe"_qs));
+    QVERIFY(SaveSetting(AppTitle(), u"Files"_qs, u"Count"_qs, u"2147483647"_qs));
+    QVERIFY(SaveSetting(AppTitle(), u"Files"_qs, u"File2"_qs, env.path(QStringLiteral("old.exe"))));
+    ListBuilder builder(DataFolders::IconsFolder());
+    builder.beginPass();
+    GameAdder adder(builder);
+    QCOMPARE(adder.AddGamesFromFolder(root).size(), 2);
+    QCOMPARE(setting(u"File2"_qs), env.path(QStringLiteral("old.exe")));
+    const QSet<QString> added {setting(u"File1"_qs), setting(u"File3"_qs)};
+    QCOMPARE(added, QSet<QString>({root + u"/one.exe"_qs, root + u"/two.exe"_qs}));
+    QCOMPARE(setting(u"Count"_qs), u"2147483647"_qs);
 }
 
 void TestGameAdder::addFolderSkipsListedGames()

@@ -24,6 +24,7 @@ private Q_SLOTS:
     void caption_data();
     void caption();
     void userNameMatchesPathLoosely();
+    void userNameOfRepeatedKey();
     void icon_data();
     void icon();
     void picturesCanBeLeftOut();
@@ -131,6 +132,21 @@ void TestListBuilder::userNameMatchesPathLoosely()
     builder.beginPass();
     QCOMPARE(builder.AddGameToList(path).caption, QStringLiteral("Mine"));
     QCOMPARE(builder.AddGameToList(env.path(QStringLiteral("games/Other.exe"))).caption, QStringLiteral("Other"));
+}
+
+// A name key written twice by hand: the list shows the name that renaming and removing read, the first one.
+void TestListBuilder::userNameOfRepeatedKey()
+{
+    TestEnvironment env;
+    const QString path = env.path(QStringLiteral("games/Game.exe"));
+    QVERIFY(writeFile(path));
+    const QByteArray settings = "[Files]\r\nCount=1\r\nFile1=" + path.toUtf8()
+        + "\r\n[FilesNames]\r\nFileName1=First\r\nfilename1=Second\r\n";
+    QVERIFY(writeFile(env.settingsFile(), settings));
+    QCOMPARE(GetSetting(AppTitle(), QStringLiteral("FilesNames"), QStringLiteral("FileName1")), u"First"_qs);
+    ListBuilder builder(DataFolders::IconsFolder());
+    builder.beginPass();
+    QCOMPARE(builder.AddGameToList(path).caption, u"First"_qs);
 }
 
 void TestListBuilder::icon_data()

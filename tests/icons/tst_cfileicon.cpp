@@ -137,6 +137,52 @@ private Q_SLOTS:
         QCOMPARE(icon.imageBytes(1), blankBitmap(16, 16, 4));
     }
 
+    // Large files: a directory or images that lie beyond what one read takes in, or straddle its end.
+    void loadReadsLargeFilesWhole_data()
+    {
+        QTest::addColumn<QByteArray>("bytes");
+        QTest::addColumn<int>("count");
+
+        QList<IconTest::FakeImage> many;
+        for (int i = 0; i < 5000; ++i) {
+            QByteArray image = blankBitmap(1, 1, 1);
+            image[40] = char(i % 256); // each image its own bytes
+            image[41] = char(i / 256);
+            many.append({1, 1, 2, 1, 1, image});
+        }
+        QTest::newRow("5,000 images, directory past the first read") << buildIconFile(many) << 5000;
+
+        QByteArray farImage = buildIconFile({{16, 16, 16, 1, 4, blankBitmap(16, 16, 4)}});
+        farImage.insert(22, QByteArray(200000, 'x'));
+        qToLittleEndian<quint32>(22 + 200000, farImage.data() + 6 + 12);
+        QTest::newRow("image far past the first read") << farImage << 1;
+
+        QByteArray straddling = buildIconFile({{32, 32, 0, 1, 8, blankBitmap(32, 32, 8)},
+            {48, 48, 0, 1, 32, blankBitmap(48, 48, 32)}, {255, 255, 0, 1, 32, blankBitmap(255, 255, 32)}});
+        QVERIFY(straddling.size() > 65536);
+        QTest::newRow("image across the end of the first read") << straddling << 3;
+    }
+
+    void loadReadsLargeFilesWhole()
+    {
+        QFETCH(QByteArray, bytes);
+        QFETCH(int, count);
+        cFileIcon icon;
+        QVERIFY(icon.LoadIcon(write(QStringLiteral("large.ico"), bytes)));
+        QCOMPARE(icon.ImageCount(), count);
+        for (int i = 1; i <= count; ++i) {
+            const IconDirEntry& entry = icon.entry(i);
+            QCOMPARE(icon.imageBytes(i), bytes.mid(entry.dwImageOffset, entry.dwBytesInRes));
+        }
+    }
+
+    void loadRefusesAFolder()
+    {
+        cFileIcon icon;
+        QVERIFY(!icon.LoadIcon(m_env.root()));
+        QCOMPARE(icon.ImageCount(), 0);
+    }
+
     void queries_data()
     {
         QTest::addColumn<int>("colourCount");

@@ -85,11 +85,17 @@ void TestCatalogueStore::damagedCounter_data()
     QTest::addColumn<QString>("count");
     QTest::addColumn<QStringList>("existing");
     QTest::addColumn<QString>("newKey");
-    QTest::newRow("blanks around") << u" 7 "_qs << QStringList {} << u"File8"_qs;
-    QTest::newRow("not a number") << u"abc"_qs << QStringList {u"File1"_qs, u"File2"_qs} << u"File3"_qs;
-    QTest::newRow("missing") << QString() << QStringList {u"File5"_qs} << u"File6"_qs;
-    QTest::newRow("too low") << u"1"_qs << QStringList {u"File1"_qs, u"file4"_qs} << u"File5"_qs;
-    QTest::newRow("negative") << u"-3"_qs << QStringList {} << u"File1"_qs;
+    QTest::addColumn<QString>("countAfter");
+    QTest::newRow("blanks around") << u" 7 "_qs << QStringList {} << u"File8"_qs << u"8"_qs;
+    QTest::newRow("not a number") << u"abc"_qs << QStringList {u"File1"_qs, u"File2"_qs} << u"File3"_qs << u"3"_qs;
+    QTest::newRow("missing") << QString() << QStringList {u"File5"_qs} << u"File6"_qs << u"6"_qs;
+    QTest::newRow("too low") << u"1"_qs << QStringList {u"File1"_qs, u"file4"_qs} << u"File5"_qs << u"5"_qs;
+    QTest::newRow("negative") << u"-3"_qs << QStringList {} << u"File1"_qs << u"1"_qs;
+    // The largest number there is has been given out: the first free one is taken, the counter stays.
+    QTest::newRow("counter at the largest number")
+        << u"2147483647"_qs << QStringList {u"File1"_qs, u"File3"_qs} << u"File2"_qs << u"2147483647"_qs;
+    QTest::newRow("entry at the largest number")
+        << u"5"_qs << QStringList {u"File2147483647"_qs, u"File1"_qs} << u"File2"_qs << u"2147483647"_qs;
 }
 
 // A counter edited by hand never makes a new game overwrite one that is still listed.
@@ -98,6 +104,7 @@ void TestCatalogueStore::damagedCounter()
     QFETCH(QString, count);
     QFETCH(QStringList, existing);
     QFETCH(QString, newKey);
+    QFETCH(QString, countAfter);
     TestEnvironment env;
     if (!count.isNull())
         SaveSetting(AppTitle(), files, u"Count"_qs, count);
@@ -106,7 +113,7 @@ void TestCatalogueStore::damagedCounter()
     QCOMPARE(CatalogueStore::AddGame(u"/g/new.exe"_qs), newKey);
     for (const QString& key : existing)
         QCOMPARE(GetSetting(AppTitle(), files, key), u"/g/"_qs + key);
-    QCOMPARE(GetSetting(AppTitle(), files, u"Count"_qs), newKey.mid(4));
+    QCOMPARE(GetSetting(AppTitle(), files, u"Count"_qs), countAfter);
 }
 
 void TestCatalogueStore::counterIsSkipped_data()
@@ -252,6 +259,9 @@ void TestCatalogueStore::gameInfoName()
     writeBytes(folder + u"/lines.bvxinf"_qs, content);
     QCOMPARE(InfoFiles::GameInfoName(folder + u"/lines.exe"_qs, lngNik), name);
     QCOMPARE(InfoFiles::GameInfoName(folder + u"/other.exe"_qs, lngNik), QString());
+    // A folder where the info file would be is no info file.
+    QVERIFY(QDir().mkpath(folder + u"/folder.bvxinf"_qs));
+    QCOMPARE(InfoFiles::GameInfoName(folder + u"/folder.exe"_qs, lngNik), QString());
 }
 
 void TestCatalogueStore::stopFolder_data()

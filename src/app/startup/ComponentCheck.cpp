@@ -2,6 +2,8 @@
 
 #include "app/CompanionComponents.h"
 #include "app/ComponentObjects.h"
+#include "app/ComponentRegistry.h"
+#include "app/LibraryFileCheck.h"
 #include "store/SettingsStore.h"
 #include "support/ProgramFolder.h"
 #include "support/UserPrompt.h"
@@ -9,6 +11,8 @@
 #include <QFileInfo>
 #include <QLibrary>
 
+#include <cstdio>
+#include <exception>
 #include <optional>
 
 namespace Brimvault::modMain {
@@ -39,6 +43,10 @@ std::optional<QString> versionText(QObject* versionObject)
 RegisterServerFunction loadRegisterServer(const QString& fileName)
 {
     const QString besideProgram = ProgramFolder() + u'/' + fileName;
+    if (QFileInfo(besideProgram).isFile()) {
+        if (const std::optional<QString> problem = LibraryFileProblem(besideProgram))
+            throw ComponentFileError(problem->toStdString());
+    }
     QLibrary library(QFileInfo(besideProgram).isFile() ? besideProgram : fileName);
     if (!library.load())
         throw ComponentFileError(library.errorString().toStdString());
@@ -46,6 +54,14 @@ RegisterServerFunction loadRegisterServer(const QString& fileName)
     if (!registerServer)
         throw ComponentFileError(fileName.toStdString() + " has no " + RegisterServerSymbol);
     return registerServer;
+}
+
+// The message box names no cause (it is the same for every failure); whoever runs the program from a
+// terminal learns the real one here.
+void explainFailure(const QString& prefix, const QString& reason)
+{
+    std::fprintf(
+        stderr, "%s: %s cannot be made usable: %s\n", qPrintable(AppTitle()), qPrintable(prefix), qPrintable(reason));
 }
 
 } // namespace
@@ -68,37 +84,50 @@ bool CheckComponent(const QString& prefix)
 {
     const QString progId = prefix + QStringLiteral(".clsVersion");
     const QString savedVersion = GetSetting(AppTitle(), settingsSection(), versionKey(prefix));
-    bool errorPending = false;
+    QString failure;
+
+    const auto storeVersion = [&](const QString& version) {
+        if (!SaveSetting(AppTitle(), settingsSection(), versionKey(prefix), version))
+            failure = QStringLiteral("the settings file %1 cannot be written").arg(SettingsFilePath(AppTitle()));
+    };
 
     CreatedObject created = CreateObject(progId);
     if (!created) {
         std::int32_t status = 0;
         try {
             status = RegisterComponent(prefix);
+        } catch (const std::exception& error) {
+            failure = QString::fromStdString(error.what());
+            status = -1;
         } catch (...) {
             status = -1;
         }
         if (status != 0) {
+            if (failure.isEmpty())
+                failure = QStringLiteral("its registration into %1 failed with status 0x%2")
+                              .arg(ComponentRegistryPath())
+                              .arg(quint32(status), 8, 16, QChar(u'0'));
+            explainFailure(prefix, failure);
             ShowAdminMessage();
             return false;
         }
         created = CreateObject(progId);
-        if (!created) {
-            errorPending = true;
-        } else if (const auto version = versionText(created.object.get())) {
-            errorPending = !SaveSetting(AppTitle(), settingsSection(), versionKey(prefix), *version);
-        } else {
-            errorPending = true;
-        }
+        if (!created)
+            failure = QStringLiteral("it was registered, but its version object cannot be created: ") + created.error;
+        else if (const auto version = versionText(created.object.get()))
+            storeVersion(*version);
+        else
+            failure = QStringLiteral("its version cannot be read");
     } else if (const auto version = versionText(created.object.get())) {
         // Any difference counts, letter case included; versions are never compared as numbers.
         if (*version != savedVersion)
-            errorPending = !SaveSetting(AppTitle(), settingsSection(), versionKey(prefix), *version);
+            storeVersion(*version);
     } else {
-        errorPending = true;
+        failure = QStringLiteral("its version cannot be read");
     }
 
-    if (errorPending) {
+    if (!failure.isEmpty()) {
+        explainFailure(prefix, failure);
         ShowAdminMessage();
         return false;
     }

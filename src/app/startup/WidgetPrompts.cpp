@@ -1,5 +1,7 @@
 #include "app/startup/WidgetPrompts.h"
 
+#include "app/startup/TestHooks.h"
+
 #include "support/UserPrompt.h"
 
 #include <QApplication>
@@ -57,16 +59,7 @@ PromptAnswer answerFor(int clicked, PromptButtons buttons)
     default:
         break;
     }
-    switch (buttons) {
-    case PromptButtons::Ok:
-        return PromptAnswer::Ok;
-    case PromptButtons::YesNo:
-        return PromptAnswer::No;
-    case PromptButtons::OkCancel:
-    case PromptButtons::YesNoCancel:
-        break;
-    }
-    return PromptAnswer::Cancel;
+    return CancellingAnswer(buttons);
 }
 
 PromptAnswer showMessageBox(const PromptRequest& request)
@@ -92,6 +85,8 @@ std::optional<QString> showInputBox(const InputRequest& request)
 
 void InstallWidgetPrompts()
 {
+    if (TestHooks::InstallPromptLogIfRequested())
+        return;
     SetPromptHandler(showMessageBox);
     SetInputHandler(showInputBox);
 }

@@ -1,6 +1,7 @@
 #include "app/startup/modMain.h"
 
 #include "app/CompanionComponents.h"
+#include "app/startup/TestHooks.h"
 #include "i18n/modLocalizer.h"
 #include "ui/main/frmMain.h"
 
@@ -36,6 +37,7 @@ void Main()
         mainWindow()->setAttribute(Qt::WA_DeleteOnClose);
     }
     mainWindow()->show();
+    TestHooks::ReportWindowWhenFilled(mainWindow());
 }
 
 } // namespace Brimvault::modMain

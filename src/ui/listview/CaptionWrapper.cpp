@@ -124,6 +124,15 @@ void CaptionWrapper::breakLines(QStringView text, qreal width, Emit&& emit) cons
                         break;
                     fitEnd = candidate;
                 }
+                // A hyphen that fits ends the line, as any word-wrapping text widget breaks after it.
+                if (fitEnd < wordEnd) {
+                    for (qsizetype hyphen = fitEnd - 1; hyphen > lineStart; --hyphen) {
+                        if (text[hyphen] == u'-') {
+                            fitEnd = hyphen + 1;
+                            break;
+                        }
+                    }
+                }
             }
             emit(lineStart, fitEnd - lineStart, widthOf(lineStart, fitEnd));
             emitted = true;

@@ -111,6 +111,13 @@ private Q_SLOTS:
         QCOMPARE(wrapper.lineCount(QStringLiteral("   "), 64), 1);
         // A word of wide letters is broken between letters rather than running out of the caption.
         QVERIFY(wrapper.lineCount(QStringLiteral("WWWWWWWWWWWWWWWW"), 64) >= 2);
+        // A word too wide for the line breaks after its hyphen rather than inside one of its parts.
+        const QString online = QString::fromUtf8("Онлайн-игры");
+        QVERIFY(QFontMetricsF(m_font).horizontalAdvance(online) > 64);
+        const QList<CaptionWrapper::Line> lines = wrapper.wrap(online, 64);
+        QCOMPARE(lines.size(), 2);
+        QCOMPARE(online.mid(lines[0].start, lines[0].length), QString::fromUtf8("Онлайн-"));
+        QCOMPARE(online.mid(lines[1].start, lines[1].length), QString::fromUtf8("игры"));
     }
 
     void arrangeThreeCellsInUsableWidth283()
