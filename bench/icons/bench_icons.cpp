@@ -1,55 +1,23 @@
 // Main-icon extraction to .ico over real PE files, beside wrestool over the same files and beside just reading
 // their bytes. Prints figure and ratio lines (ratios are our time over the reference's: below 1 is ahead).
+#include "RealPeFiles.h"
 #include "icons/cFileIcon.h"
 
 #include <QCoreApplication>
-#include <QCryptographicHash>
 #include <QDir>
-#include <QDirIterator>
 #include <QElapsedTimer>
 #include <QFile>
 #include <QProcess>
-#include <QSet>
 #include <QStandardPaths>
 #include <QTemporaryDir>
 #include <QTextStream>
 #include <algorithm>
 #include <functional>
+#include <limits>
 
 using namespace Brimvault;
 
 namespace {
-
-QStringList peFiles()
-{
-    QStringList roots {QStringLiteral(BRIMVAULT_TEST_DATA_DIR "/pe"), QStringLiteral("/usr/lib/gcc/x86_64-w64-mingw32"),
-        QStringLiteral("/usr/lib/gcc/i686-w64-mingw32"), QStringLiteral("/usr/x86_64-w64-mingw32/lib"),
-        QStringLiteral("/usr/i686-w64-mingw32/lib"), QStringLiteral("/usr/lib/python3"),
-        QStringLiteral("/usr/lib/wine"), QStringLiteral("/usr/lib/x86_64-linux-gnu/wine"),
-        QStringLiteral("/usr/lib/perf-core"), QStringLiteral("/usr/lib/google-cloud-sdk/platform"),
-        QDir::homePath() + QStringLiteral("/.pyenv/versions")};
-    const QString extra = qEnvironmentVariable("BRIMVAULT_PE_CORPUS");
-    if (!extra.isEmpty())
-        roots = extra.split(u':', Qt::SkipEmptyParts) + roots;
-    QStringList files;
-    QSet<QByteArray> seen;
-    for (const QString& root : roots) {
-        QDirIterator it(
-            root, {QStringLiteral("*.exe"), QStringLiteral("*.dll")}, QDir::Files, QDirIterator::Subdirectories);
-        while (it.hasNext()) {
-            const QString path = it.next();
-            QFile file(path);
-            if (file.size() < 64 || !file.open(QIODevice::ReadOnly) || file.peek(2) != "MZ")
-                continue;
-            const QByteArray hash = QCryptographicHash::hash(file.readAll(), QCryptographicHash::Sha1);
-            if (!seen.contains(hash)) {
-                seen.insert(hash);
-                files.append(path);
-            }
-        }
-    }
-    return files;
-}
 
 // Median seconds per pass over the files, each sample repeating passes for at least a quarter second.
 double secondsPerPass(const std::function<void()>& pass)
@@ -75,7 +43,8 @@ int main(int argc, char** argv)
 {
     QCoreApplication app(argc, argv);
     QTextStream out(stdout);
-    const QStringList files = peFiles();
+    const QStringList files
+        = RealPeFiles({QStringLiteral(BRIMVAULT_TEST_DATA_DIR "/pe")}, std::numeric_limits<int>::max());
     QTemporaryDir scratch;
     if (files.isEmpty() || !scratch.isValid()) {
         out << "no PE files found\n";
