@@ -142,8 +142,10 @@ QList<ListedGame> ListAsDiscovered(const QString& program, const QProcessEnviron
     process.setProcessEnvironment(headless);
     process.start(program, {QStringLiteral("--list"), QStringLiteral("--json")});
     QList<ListedGame> games;
-    if (!process.waitForFinished(60000) || process.exitCode() != 0)
+    if (!process.waitForFinished(60000) || process.exitStatus() != QProcess::NormalExit || process.exitCode() != 0) {
+        qWarning("--list --json failed (exit %d): %s", process.exitCode(), process.readAllStandardError().constData());
         return games;
+    }
     const QJsonArray entries = QJsonDocument::fromJson(process.readAllStandardOutput()).array();
     for (const QJsonValue& entry : entries) {
         const QJsonObject game = entry.toObject();
