@@ -425,6 +425,12 @@ private Q_SLOTS:
         QTRY_VERIFY_WITH_TIMEOUT(
             QFile::exists(IconCacheFile(DataFolders::IconsFolder(), installedGame)), StateTimeoutMs);
         QTRY_COMPARE_WITH_TIMEOUT(itemsShown(), shownBefore + 1, StateTimeoutMs);
+        // The service also raised the new-game signal: the window takes it within a few seconds and fills its
+        // list once more, dropping the selection and any open menu. Later steps start after that.
+        QTRY_COMPARE_WITH_TIMEOUT(GetSetting(AppTitle(), CatalogueKeys::CommandsSection,
+                                      CatalogueKeys::NewGameInstalledKey, CatalogueKeys::NoNewGameInstalled),
+            CatalogueKeys::NoNewGameInstalled, StateTimeoutMs);
+        QTRY_COMPARE_WITH_TIMEOUT(itemsShown(), shownBefore + 1, StateTimeoutMs);
         QVERIFY(DriveLibrary::IndexOfPath(discovered(), installedGame) > 0);
         keepScreenshot(QStringLiteral("installed"));
     }
