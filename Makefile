@@ -3,7 +3,7 @@ BUILD ?= build
 CMAKE_FLAGS ?=
 CTEST_FLAGS ?= --output-on-failure
 
-.PHONY: all deps configure build run test bench format format-check fuzz-smoke clean
+.PHONY: all deps configure build run test bench format format-check fuzz-smoke windows-check clean
 
 all: build
 
@@ -33,6 +33,10 @@ format: configure
 
 format-check: configure
 	cmake --build $(BUILD) --target format-check
+
+# Every source compiled for Windows (syntax and types only) with MinGW-w64, from the build's own list.
+windows-check: build
+	tools/windows-check.py $(BUILD) .
 
 fuzz-smoke: deps
 	@if [ -x tools/fuzz-smoke.sh ]; then tools/fuzz-smoke.sh; else echo "no fuzz targets yet"; fi
