@@ -3,7 +3,7 @@ BUILD ?= build
 CMAKE_FLAGS ?=
 CTEST_FLAGS ?= --output-on-failure
 
-.PHONY: all deps configure build run test bench format format-check fuzz-smoke clean
+.PHONY: all deps configure build run test bench format format-check fuzz-smoke package test-package clean
 
 all: build
 
@@ -33,6 +33,14 @@ format: configure
 
 format-check: configure
 	cmake --build $(BUILD) --target format-check
+
+# The Debian package from the install layout: build/brimvault_<version>_amd64.deb.
+package: build
+	cd $(BUILD) && cpack -G DEB
+
+# Installs that package in a fresh Debian 12 root (debootstrap; root only) and runs it there.
+test-package: package
+	tools/test-package.sh $$(ls -t $(BUILD)/brimvault_*_amd64.deb | head -n1)
 
 fuzz-smoke: deps
 	@if [ -x tools/fuzz-smoke.sh ]; then tools/fuzz-smoke.sh; else echo "no fuzz targets yet"; fi
