@@ -3,7 +3,7 @@ BUILD ?= build
 CMAKE_FLAGS ?=
 CTEST_FLAGS ?= --output-on-failure
 
-.PHONY: all deps configure build run test bench format format-check fuzz-smoke windows-check clean
+.PHONY: all deps configure build run test bench format format-check fuzz-smoke windows-check package test-package clean
 
 all: build
 
@@ -37,6 +37,13 @@ format-check: configure
 # Every source compiled for Windows (syntax and types only) with MinGW-w64, from the build's own list.
 windows-check: build
 	tools/windows-check.py $(BUILD) .
+# The Debian package from the install layout: build/brimvault_<version>_amd64.deb.
+package: build
+	cd $(BUILD) && cpack -G DEB
+
+# Installs that package in a fresh Debian 12 root (debootstrap; root only) and runs it there.
+test-package: package
+	tools/test-package.sh $$(ls -t $(BUILD)/brimvault_*_amd64.deb | head -n1)
 
 fuzz-smoke: deps
 	@if [ -x tools/fuzz-smoke.sh ]; then tools/fuzz-smoke.sh; else echo "no fuzz targets yet"; fi

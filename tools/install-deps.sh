@@ -9,6 +9,7 @@ packages=(
     mingw-w64 icoutils python3-pefile
     clang libclang-rt-14-dev clang-format
     desktop-file-utils appstream librsvg2-bin
+    dpkg-dev lintian
 )
 
 missing=()
