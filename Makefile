@@ -37,6 +37,7 @@ format-check: configure
 # Every source compiled for Windows (syntax and types only) with MinGW-w64, from the build's own list.
 windows-check: build
 	tools/windows-check.py $(BUILD) .
+
 # The Debian package from the install layout: build/brimvault_<version>_amd64.deb.
 package: build
 	cd $(BUILD) && cpack -G DEB
