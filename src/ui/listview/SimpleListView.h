@@ -108,6 +108,7 @@ private:
         int index = -1;
         bool onIcon = false;
         QPointF origin;
+        bool background = false; // pressed on the empty background
     };
 
     // Items
