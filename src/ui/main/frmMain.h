@@ -113,6 +113,7 @@ private:
 
     // Catalogue
     void addEntry(const GameEntry& entry);
+    void addListItem(const GameEntry& entry);
     void tmrIconsTimer();
     void startIconTimerIfNeeded();
     void listDragDrop(const QMimeData* dropped, qint32& effect);
