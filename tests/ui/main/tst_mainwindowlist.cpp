@@ -43,29 +43,20 @@ void dropFile(SimpleListView* list, const QString& file)
 class TestMainWindowList : public QObject {
     Q_OBJECT
 
-private:
-    std::unique_ptr<TestEnvironment> m_env;
-    std::unique_ptr<ProgramFolderFixture> m_program;
+    TestEnvironment m_env;
+    ProgramFolderFixture m_program {false};
 
 private Q_SLOTS:
-    void init()
+    void initTestCase()
     {
-        m_env = std::make_unique<TestEnvironment>();
-        m_program = std::make_unique<ProgramFolderFixture>(false);
         SetPromptHandler([](const PromptRequest&) { return PromptAnswer::Yes; });
-    }
-    void cleanup()
-    {
-        SetPromptHandler({});
-        m_program.reset();
-        m_env.reset();
     }
 
     void removingOneGameLeavesTheRestAsItWas()
     {
         for (int i = 0; i < 120; ++i)
-            QVERIFY(WriteFile(m_env->path(QStringLiteral("commonappdata/Brimvault/Game%1/game%1.exe").arg(i))));
-        const QString solitaire = m_env->path(QStringLiteral("windows/sol.exe"));
+            QVERIFY(WriteFile(m_env.path(QStringLiteral("commonappdata/Brimvault/Game%1/game%1.exe").arg(i))));
+        const QString solitaire = m_env.path(QStringLiteral("windows/sol.exe"));
         QVERIFY(WriteFile(solitaire));
         frmMain window;
         QSignalSpy rebuilt(&window, &frmMain::listRebuilt);
@@ -117,7 +108,7 @@ private Q_SLOTS:
 
     void fullListKeepsTheWindowUsable()
     {
-        const QString extra = m_env->path(QStringLiteral("personal/Drop/extra.exe"));
+        const QString extra = m_env.path(QStringLiteral("personal/Drop/extra.exe"));
         QVERIFY(WriteFile(extra));
         frmMain window;
         QSignalSpy rebuilt(&window, &frmMain::listRebuilt);
