@@ -109,4 +109,10 @@ bool ListBuilder::IsGameListed(const QString& path) const
     return m_knownPaths.contains(knownPathOf(path));
 }
 
+void ListBuilder::ForgetGame(const QString& path)
+{
+    m_knownPaths.remove(knownPathOf(path));
+    m_addedGames.read();
+}
+
 } // namespace Brimvault

@@ -21,6 +21,8 @@ public:
     // The item for the game; its lower-cased, trimmed path becomes a known path.
     GameEntry AddGameToList(const QString& path);
     bool IsGameListed(const QString& path) const;
+    // A game removed from the list: its path is no longer known, and the added games are read again.
+    void ForgetGame(const QString& path);
 
     // The name before tidying: the user's name, the info file, the built-in tables, the version
     // description, the file title; first non-empty wins.

@@ -27,6 +27,8 @@ ImageCtrl::ImageCtrl(QWidget* parent)
     : QWidget(parent)
 {
     setAttribute(Qt::WA_OpaquePaintEvent);
+    // Moves are passed on with no button held too, as the platform's control reports them.
+    setMouseTracking(true);
     m_face.setBackColor(palette().color(QPalette::Button).rgb());
     resize(ListGrid::IconSize, ListGrid::IconSize);
 }

@@ -1,5 +1,6 @@
 #include "ui/listview/SimpleListView.h"
 
+#include "icons/NumberedError.h"
 #include "ui/listview/GridLayout.h"
 #include "ui/listview/ListConstants.h"
 #include "ui/listview/ListElements.h"
@@ -59,8 +60,11 @@ qint16 SimpleListView::AddEx(const QString& Caption, const QString& Data)
 bool SimpleListView::addItem(const QPixmap* picture, const QString& caption, const QString& dataString)
 {
     const int index = m_state.itemCount;
-    if (index >= ListGrid::MaxItems)
-        return false;
+    if (index >= ListGrid::MaxItems) {
+        const ListError overflow = ListError::overflow();
+        throw NumberedError(
+            quint32(overflow.number), overflow.description, ErrorSource(QStringLiteral("SimpleListView")));
+    }
     if (index > 0 && index != m_model.loadedCount())
         return false; // that element is already loaded
     ListItem& item = index > 0 ? m_model.load() : m_model.at(0);

@@ -32,7 +32,7 @@ public:
 
     void ArrangeConstituentControls();
     bool Add(const QPixmap& Picture, const QString& Caption, const QString& Data);
-    // Both refuse (false, -1) beyond 32767 items; AddEx returns the new item's index.
+    // Both raise the overflow error (NumberedError 6) beyond 32767 items; AddEx returns the new item's index.
     qint16 AddEx(const QString& Caption, const QString& Data);
     // Removing the only item fails with the missing-element error and leaves the selection tag at "-1";
     // nothing else changes, so the host clears the list with RemoveAll instead.
@@ -108,6 +108,7 @@ private:
         int index = -1;
         bool onIcon = false;
         QPointF origin;
+        bool background = false; // pressed on the empty background
     };
 
     // Items

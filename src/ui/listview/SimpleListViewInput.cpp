@@ -175,14 +175,17 @@ qint16 SimpleListView::shiftState(Qt::KeyboardModifiers modifiers) const
 
 void SimpleListView::mousePressEvent(QMouseEvent* event)
 {
+    const bool firstButton = event->buttons() == event->button();
     const Hit hit = hitTest(event->position());
-    if (hit.index < 0) {
-        m_capture = {};
+    // Whatever is pressed first keeps the mouse until the last button is released, as a child control would;
+    // the background is the list's own, and the items hear nothing of it.
+    if (firstButton)
+        m_capture = hit.index < 0 ? Hit {-1, false, {}, true} : hit;
+    if (hit.index < 0 || m_capture.background) {
         QWidget::mousePressEvent(event);
         return;
     }
-    // The element pressed keeps the mouse until the last button is released, as a child control would.
-    if (event->buttons() == event->button() || m_capture.index < 0)
+    if (m_capture.index < 0)
         m_capture = hit;
     selectItem(hit.index);
     const QPointF local = event->position() - hit.origin;
@@ -191,8 +194,11 @@ void SimpleListView::mousePressEvent(QMouseEvent* event)
 
 void SimpleListView::mouseMoveEvent(QMouseEvent* event)
 {
+    const bool held = event->buttons() != Qt::NoButton;
+    if (held && m_capture.background)
+        return;
     Hit target = m_capture;
-    if (target.index < 0 || event->buttons() == Qt::NoButton)
+    if (target.index < 0 || !held)
         target = hitTest(event->position());
     if (target.index < 0 || !m_model.isLoaded(target.index))
         return;
@@ -202,7 +208,7 @@ void SimpleListView::mouseMoveEvent(QMouseEvent* event)
 
 void SimpleListView::mouseReleaseEvent(QMouseEvent* event)
 {
-    const Hit target = m_capture.index >= 0 ? m_capture : hitTest(event->position());
+    const Hit target = m_capture.index >= 0 || m_capture.background ? m_capture : hitTest(event->position());
     if (event->buttons() == Qt::NoButton)
         m_capture = {};
     if (target.index < 0 || !m_model.isLoaded(target.index))
@@ -217,9 +223,9 @@ void SimpleListView::mouseReleaseEvent(QMouseEvent* event)
 void SimpleListView::mouseDoubleClickEvent(QMouseEvent* event)
 {
     const Hit hit = hitTest(event->position());
+    m_capture = hit.index < 0 ? Hit {-1, false, {}, true} : hit;
     if (hit.index < 0)
         return;
-    m_capture = hit;
     if (m_state.lastButton != 1)
         return;
     QString currentData = m_model.at(hit.index).tag;

@@ -5,6 +5,7 @@
 #include "gameactions/PackageInstallCommand.h"
 #include "i18n/ApplyLanguage.h"
 #include "i18n/modLocalizer.h"
+#include "media/ReclamaSchedule.h"
 #include "store/DataFolders.h"
 #include "store/SettingsStore.h"
 #include "support/CommandLine.h"
@@ -18,6 +19,7 @@
 
 #include <QCloseEvent>
 #include <QCoreApplication>
+#include <QGuiApplication>
 #include <QLinearGradient>
 #include <QMenu>
 #include <QPainter>
@@ -51,6 +53,7 @@ frmMain::frmMain(QWidget* parent)
     connectGameActions();
     connectMediaHost();
     placeControls();
+    connect(qGuiApp, &QGuiApplication::commitDataRequest, this, &frmMain::sessionEnding, Qt::DirectConnection);
 
     // Loading, up to the list: captions, the screen's resolution, the centre of the screen. The list is
     // filled once the window shows, so that the user watches it fill.
@@ -222,13 +225,29 @@ void frmMain::keepActionsButtonAtRightEdge()
 
 void frmMain::closeEvent(QCloseEvent* event)
 {
-    if (!m_closing) {
-        m_closing = true;
-        m_closedByUser = event->spontaneous();
-        m_tmrIcons->stop();
-        Q_EMIT closing();
-    }
+    using ReclamaSchedule::UnloadMode;
+    if (qGuiApp->isSavingSession())
+        queryUnload(UnloadMode::AppWindows);
+    else
+        queryUnload(event->spontaneous() ? UnloadMode::FormControlMenu : UnloadMode::FormCode);
     event->accept();
+}
+
+void frmMain::queryUnload(ReclamaSchedule::UnloadMode mode)
+{
+    if (m_closing)
+        return;
+    m_closing = true;
+    m_tmrIcons->stop();
+    Q_EMIT closing();
+    showDueReclama(mode);
+}
+
+void frmMain::sessionEnding()
+{
+    // The session manager does not close windows itself; the window unloads as it would at a system shutdown.
+    queryUnload(ReclamaSchedule::UnloadMode::AppWindows);
+    close();
 }
 
 void frmMain::enterBusy()

@@ -14,6 +14,10 @@ class QTimer;
 
 namespace Brimvault {
 
+namespace ReclamaSchedule {
+enum class UnloadMode;
+}
+
 class ClickLabel;
 class GameLauncher;
 class IconCacheBuilder;
@@ -101,6 +105,12 @@ private:
     void captionMenus();
     void connectMediaHost();
 
+    // Every close runs this once: the closing flag stops discovery and the icon builder, then the advertisement
+    // that is due shows when the mode allows one.
+    void queryUnload(ReclamaSchedule::UnloadMode mode);
+    void showDueReclama(ReclamaSchedule::UnloadMode mode);
+    void sessionEnding();
+
     // Discovery and waiting for the service let events run, so the window may be asked to close meanwhile.
     void enterBusy();
     void leaveBusy();
@@ -113,6 +123,7 @@ private:
 
     // Catalogue
     void addEntry(const GameEntry& entry);
+    void addListItem(const GameEntry& entry);
     void tmrIconsTimer();
     void startIconTimerIfNeeded();
     void listDragDrop(const QMimeData* dropped, qint32& effect);
@@ -148,7 +159,6 @@ private:
     QString m_lastAddFileFolder;
     int m_actionsRightMargin = 0;
     bool m_closing = false;
-    bool m_closedByUser = false;
     bool m_loaded = false;
     // Discovery lets events run; a rebuild asked for meanwhile runs after it, and a close waits for it.
     int m_busy = 0;

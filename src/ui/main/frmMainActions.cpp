@@ -4,6 +4,7 @@
 
 #include "app/CatalogueServer.h"
 #include "app/ConnectionCheck.h"
+#include "catalogue/ListBuilder.h"
 #include "gameactions/GameLauncher.h"
 #include "gameactions/GameRemoval.h"
 #include "gameactions/GameRenaming.h"
@@ -87,11 +88,14 @@ void frmMain::mnuInstallClick()
 
 void frmMain::mnuRemoveFileClick()
 {
-    if (AskAndRemoveGame(currentCaption(), m_listView->GetCurrentData()) != RemovalOutcome::Removed)
+    const QString itemData = m_listView->GetCurrentData();
+    if (AskAndRemoveGame(currentCaption(), itemData) != RemovalOutcome::Removed)
         return;
-    // The rebuild drops the item and every known path that went with it.
-    m_listView->RemoveAll();
-    RebuildList();
+    // Only this item goes: a rebuild would lose the selection and the scroll position, and bring back a game
+    // that discovery finds by itself. The list cannot remove its only item, so that one is cleared.
+    if (m_listView->RemoveCurrentItem())
+        m_listView->RemoveAll();
+    m_builder->ForgetGame(itemData);
 }
 
 void frmMain::mnuRemoveAllFilesClick()

@@ -7,6 +7,7 @@
 #include "catalogue/GameEntry.h"
 #include "catalogue/IconCacheBuilder.h"
 #include "catalogue/ListBuilder.h"
+#include "icons/NumberedError.h"
 #include "support/PathFunctions.h"
 #include "support/SystemFolders.h"
 #include "ui/listview/ImageCtrl.h"
@@ -61,6 +62,15 @@ void frmMain::RebuildList()
 }
 
 void frmMain::addEntry(const GameEntry& entry)
+{
+    // Beyond 32767 items the list raises its overflow error: the games that fit stay shown, the rest are
+    // left out.
+    try {
+        addListItem(entry);
+    } catch (const NumberedError&) { }
+}
+
+void frmMain::addListItem(const GameEntry& entry)
 {
     switch (entry.source) {
     case IconSource::File:

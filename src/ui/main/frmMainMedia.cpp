@@ -3,10 +3,8 @@
 #include "ui/main/frmMain.h"
 
 #ifdef BRIMVAULT_WITH_MEDIA
-#include "media/ReclamaSchedule.h"
+#include "media/ReclamaOnClose.h"
 #include "media/frmReclama.h"
-
-#include <QGuiApplication>
 #endif
 
 namespace Brimvault {
@@ -18,16 +16,15 @@ void frmMain::connectMediaHost()
         auto* host = new frmReclama;
         host->RunGame(path, caption);
     });
-    connect(this, &frmMain::closing, this, [this] {
-        const auto mode
-            = m_closedByUser ? ReclamaSchedule::UnloadMode::FormControlMenu : ReclamaSchedule::UnloadMode::FormCode;
-        if (qApp->isSavingSession())
-            return;
-        if (const std::optional<ReclamaSchedule::DueReclama> due = ReclamaSchedule::ReclamaToShow(mode)) {
-            auto* host = new frmReclama;
-            host->ReclamaShow(due->filePath, due->address);
-        }
-    });
+#endif
+}
+
+void frmMain::showDueReclama(ReclamaSchedule::UnloadMode mode)
+{
+#ifdef BRIMVAULT_WITH_MEDIA
+    ShowDueReclama(mode);
+#else
+    Q_UNUSED(mode);
 #endif
 }
 

@@ -1,3 +1,4 @@
+#include "icons/NumberedError.h"
 #include "ui/listview/ListConstants.h"
 #include "ui/listview/ListElements.h"
 #include "ui/listview/SimpleListView.h"
@@ -14,6 +15,7 @@
 #include <QTimer>
 #include <QUrl>
 
+#include <functional>
 #include <memory>
 
 using namespace Brimvault;
@@ -643,8 +645,16 @@ private Q_SLOTS:
         for (int i = 0; i < ListGrid::MaxItems; ++i)
             list.AddEx(QStringLiteral("G"), QString());
         QCOMPARE(list.layoutState().itemCount, 32767);
-        QCOMPARE(list.AddEx(QStringLiteral("One too many"), QString()), qint16(-1));
-        QVERIFY(!list.Add(QPixmap(), QStringLiteral("One too many"), QString()));
+        const auto raisesOverflow = [](const std::function<void()>& add) {
+            try {
+                add();
+            } catch (const NumberedError& error) {
+                return error.number() == 6 && error.message() == u"Overflow";
+            }
+            return false;
+        };
+        QVERIFY(raisesOverflow([&] { list.AddEx(QStringLiteral("One too many"), QString()); }));
+        QVERIFY(raisesOverflow([&] { list.Add(QPixmap(), QStringLiteral("One too many"), QString()); }));
         QCOMPARE(list.loadedCount(), 32767);
     }
 

@@ -1,0 +1,71 @@
+// Closing the main window: the advertisement that is due shows, except when the session is ending.
+#include "DriveLibrary.h"
+#include "MainWindowFixture.h"
+#include "TestEnvironment.h"
+#include "media/WebEngineStartup.h"
+#include "media/frmReclama.h"
+#include "store/DataFolders.h"
+#include "ui/main/frmMain.h"
+
+#include <QApplication>
+#include <QPointer>
+#include <QSessionManager>
+#include <QSignalSpy>
+#include <QTest>
+
+using namespace Brimvault;
+
+class TestFrmMainClose : public QObject {
+    Q_OBJECT
+
+    TestEnvironment m_env;
+    ProgramFolderFixture m_program {false};
+
+private Q_SLOTS:
+    void advertisementOnClose_data()
+    {
+        QTest::addColumn<bool>("sessionEnds");
+        QTest::newRow("closed by the program") << false;
+        QTest::newRow("system shutdown") << true;
+    }
+    void advertisementOnClose()
+    {
+        QFETCH(bool, sessionEnds);
+        QVERIFY(
+            DriveLibrary::WriteDueAdvertisement(DataFolders::ReclamaFolder(), QStringLiteral("http://ads.example")));
+        QPointer<frmMain> window = new frmMain;
+        window->setAttribute(Qt::WA_DeleteOnClose);
+        QSignalSpy rebuilt(window.data(), &frmMain::listRebuilt);
+        window->show();
+        QVERIFY(rebuilt.wait(10000));
+        if (sessionEnds) {
+            // The session manager's own request, as the platform delivers it when the user logs out.
+            auto* manager = qApp->findChild<QSessionManager*>();
+            QVERIFY2(manager, "the application has no session manager");
+            Q_EMIT qApp->commitDataRequest(*manager);
+        } else {
+            window->close();
+        }
+        QTRY_VERIFY(window.isNull());
+        QList<frmReclama*> shown;
+        for (QWidget* top : QApplication::topLevelWidgets()) {
+            if (auto* host = qobject_cast<frmReclama*>(top); host && host->isVisible())
+                shown.append(host);
+        }
+        QCOMPARE(shown.size(), sessionEnds ? 0 : 1);
+        for (frmReclama* host : shown) {
+            QCOMPARE(host->ClickAddress(), QStringLiteral("http://ads.example"));
+            host->close();
+        }
+    }
+};
+
+int main(int argc, char* argv[])
+{
+    PrepareWebEngine();
+    QApplication app(argc, argv);
+    TestFrmMainClose test;
+    return QTest::qExec(&test, argc, argv);
+}
+
+#include "tst_frmmainclose.moc"
