@@ -17,11 +17,11 @@ bool isSideFile(const QString& name)
 
 void SideFiles::remember(const QString& folder, const QStringList& files)
 {
-    QHash<QString, QStringList>& names = m_folders[folder];
+    QStringList& names = m_folders[folder];
     names.clear();
     for (const QString& file : files) {
         if (isSideFile(file))
-            names[file.toLower()].append(file);
+            names.append(file);
     }
 }
 
@@ -32,10 +32,8 @@ QString SideFiles::find(const QString& folder, const QString& name)
         remember(folder, FolderWalk::ListFolder(folder).files);
         known = m_folders.constFind(folder);
     }
-    const QStringList spellings = known->value(name.toLower());
-    if (spellings.isEmpty())
-        return QString();
-    return folder + (spellings.contains(name) ? name : spellings.constFirst());
+    const QString match = matchName(*known, name);
+    return match.isEmpty() ? QString() : folder + match;
 }
 
 QString SideFiles::matchName(const QStringList& files, const QString& name)

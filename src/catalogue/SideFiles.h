@@ -22,8 +22,8 @@ public:
     static QString matchName(const QStringList& files, const QString& name);
 
 private:
-    // Per folder: lower-cased name -> the spellings on disk, only for info files and icons.
-    QHash<QString, QHash<QString, QStringList>> m_folders;
+    // Per folder its info files and icons only: a handful of names, so a scan beats a hash in time and room.
+    QHash<QString, QStringList> m_folders;
 };
 
 } // namespace Brimvault
