@@ -1,5 +1,6 @@
 #include "GameInstaller.h"
 
+#include "DiskSpace.h"
 #include "PackageArchive.h"
 #include "PackageLimits.h"
 #include "PackagePlan.h"
@@ -12,14 +13,11 @@
 
 #include <QDir>
 #include <QFileInfo>
-#include <QStorageInfo>
 
 namespace Brimvault {
 
 namespace {
 
-constexpr qint64 BlockSize = 4096;
-constexpr qint64 SpaceMargin = 16 * 1024 * 1024;
 constexpr QLatin1String RetiredFolder("retired");
 
 QString quoted(const QString& text)
@@ -48,16 +46,11 @@ QString existingGameFolder(const QString& gamesFolder, const QString& gameFolder
 
 QString freeSpaceProblem(const QString& gamesFolder, const PackagePlan& plan)
 {
-    QStorageInfo storage(gamesFolder);
-    storage.refresh();
-    if (!storage.isValid())
-        return QString();
+    // Where the free space cannot be known, a disk that fills while unpacking is caught there instead.
+    const std::optional<qint64> available = FreeBytes(gamesFolder);
     const qint64 needed = RequiredFreeSpace(plan.totalBytes, plan.fileCount);
-    const qint64 available = storage.bytesAvailable();
-    if (available >= 0 && available < needed)
-        return QStringLiteral("There is not enough free space for the game: it needs %1 MB, %2 MB are free.")
-            .arg((needed + 1048575) / 1048576)
-            .arg(available / 1048576);
+    if (available && *available < needed)
+        return NotEnoughSpaceProblem(needed, available);
     return QString();
 }
 
@@ -131,11 +124,6 @@ QString unpackAndMove(const QString& packagePath, const QString& gamesFolder, co
 }
 
 } // namespace
-
-qint64 RequiredFreeSpace(qint64 totalBytes, qint64 fileCount)
-{
-    return totalBytes + fileCount * BlockSize + SpaceMargin;
-}
 
 InstallResult InstallPackage(const QString& packagePath, const ProgressCallback& progress, const PhaseCallback& phase)
 {

@@ -1,5 +1,6 @@
 #pragma once
 
+#include "DiskSpace.h"
 #include "PackageExtractor.h"
 
 #include <QString>
@@ -25,8 +26,5 @@ using PhaseCallback = std::function<void(InstallPhase phase, const QString& game
 // reinstalled keeps its old copy.
 InstallResult InstallPackage(
     const QString& packagePath, const ProgressCallback& progress = {}, const PhaseCallback& phase = {});
-
-// Extra room a package needs beyond its bytes: file system blocks and a margin for everything else.
-qint64 RequiredFreeSpace(qint64 totalBytes, qint64 fileCount);
 
 } // namespace Brimvault

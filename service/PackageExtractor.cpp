@@ -1,5 +1,6 @@
 #include "PackageExtractor.h"
 
+#include "DiskSpace.h"
 #include "PackageArchive.h"
 #include "PackagePlan.h"
 
@@ -23,11 +24,13 @@ QString damaged(const QString& path, const QString& detail)
 
 class Extraction {
 public:
-    Extraction(PackageArchive& archive, const QString& targetFolder, const ProgressCallback& progress, qint64 total)
+    Extraction(
+        PackageArchive& archive, const QString& targetFolder, const ProgressCallback& progress, const PackagePlan& plan)
         : m_archive(archive)
         , m_target(targetFolder)
         , m_progress(progress)
-        , m_total(total)
+        , m_total(plan.totalBytes)
+        , m_needed(RequiredFreeSpace(plan.totalBytes, plan.fileCount))
     { }
 
     QString entry(const PlannedEntry& planned)
@@ -52,8 +55,12 @@ private:
         return true;
     }
 
+    // Asked right after the failed call, while its error is still the thread's last one; a short write sets
+    // no error, so the file system is asked too.
     QString cannotWrite(const QString& path, const QString& detail)
     {
+        if (LastErrorWasDiskFull() || FileSystemFull(m_target))
+            return NotEnoughSpaceProblem(m_needed, std::nullopt);
         return QStringLiteral("Could not write %1 (%2).").arg(quoted(path), detail);
     }
 
@@ -97,6 +104,7 @@ private:
     QString m_target;
     const ProgressCallback& m_progress;
     qint64 m_total = 0;
+    qint64 m_needed = 0;
     qint64 m_done = 0;
     QSet<QString> m_folders;
 };
@@ -116,7 +124,7 @@ bool sameEntry(const EntryHeader& header, const PlannedEntry& planned)
 QString ExtractPackage(
     PackageArchive& archive, const PackagePlan& plan, const QString& targetFolder, const ProgressCallback& progress)
 {
-    Extraction extraction(archive, targetFolder, progress, plan.totalBytes);
+    Extraction extraction(archive, targetFolder, progress, plan);
     EntryHeader header;
     for (const PlannedEntry& planned : plan.entries) {
         if (archive.nextHeader(header) != PackageArchive::Next::Entry)

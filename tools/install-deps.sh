@@ -16,6 +16,10 @@ missing=()
 for p in "${packages[@]}"; do
     dpkg-query -W -f='${Status}' "$p" 2>/dev/null | grep -q 'install ok installed' || missing+=("$p")
 done
+# Node.js and npm install Ruffle, which plays Flash movies (tools/install-ruffle.sh). A Node.js installed
+# from elsewhere with its own npm is kept as it is.
+command -v node >/dev/null 2>&1 || missing+=(nodejs)
+command -v npm >/dev/null 2>&1 || missing+=(npm)
 
 if ((${#missing[@]})); then
     sudo=""

@@ -1,6 +1,7 @@
 #include "catalogue/FolderWalk.h"
 
 #include "catalogue/CatalogueLocations.h"
+#include "catalogue/SideFiles.h"
 #include "store/CatalogueKeys.h"
 #include "store/InfoFiles.h"
 
@@ -57,12 +58,8 @@ bool firstVisit(const Listing& listing, WalkState& state)
 // The stop mark is looked for in the listing, so that folders without one cost no extra file look-up.
 bool isStopFolder(const QString& folder, const Listing& listing)
 {
-#ifdef Q_OS_WIN
-    constexpr Qt::CaseSensitivity nameCase = Qt::CaseInsensitive;
-#else
-    constexpr Qt::CaseSensitivity nameCase = Qt::CaseSensitive;
-#endif
-    return listing.files.contains(CatalogueKeys::DirInfoFileName, nameCase) && InfoFiles::IsStopFolder(folder);
+    const QString mark = SideFiles::matchName(listing.files, CatalogueKeys::DirInfoFileName);
+    return !mark.isEmpty() && InfoFiles::IsStopMark(folder + mark);
 }
 
 // ownIndex is the folder's place in the result, -1 for the root, which the caller keeps itself.

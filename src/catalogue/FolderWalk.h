@@ -29,8 +29,8 @@ struct WalkedFolder {
 };
 
 // Every folder below `folder`, not the folder itself: its children, then the subtree of the first child
-// (its children first), then that of the second, and so on. A folder whose "DirInfo.bvxinf" says
-// "StopDir" = "Yes" is collected by its parent but nothing below it is.
+// (its children first), then that of the second, and so on. A folder whose "DirInfo.bvxinf" (in any letter
+// case) says "StopDir" = "Yes" is collected by its parent but nothing below it is.
 QList<WalkedFolder> CollectSubfolders(const QString& folder);
 
 // The files of a walked folder: the listing the walk kept, else a fresh one.

@@ -28,7 +28,9 @@ std::optional<GameEntry> GameAdder::AddGameFile(const QString& file)
     if (file.isEmpty() || m_builder.IsGameListed(file))
         return std::nullopt;
     RecordAddedGame(file);
-    return m_builder.AddGameToList(file);
+    GameEntry entry = m_builder.AddGameToList(file);
+    m_builder.endPass();
+    return entry;
 }
 
 QList<GameEntry> GameAdder::AddGamesFromFolder(const QString& folder, const EntrySink& sink)
@@ -64,6 +66,7 @@ QList<GameEntry> GameAdder::AddGamesFromFolder(const QString& folder, const Entr
         }
     }
     SaveSetting(AppTitle(), CatalogueKeys::FilesSection, CatalogueKeys::CountKey, QString::number(count));
+    m_builder.endPass();
     return added;
 }
 
@@ -81,6 +84,7 @@ QList<GameEntry> GameAdder::AddDroppedFiles(const QStringList& files, const Entr
         if (sink)
             sink(added.constLast());
     }
+    m_builder.endPass();
     return added;
 }
 

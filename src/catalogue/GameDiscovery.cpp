@@ -8,6 +8,8 @@
 #include "catalogue/WindowsGames.h"
 #include "support/PathFunctions.h"
 
+#include <QScopeGuard>
+
 namespace Brimvault {
 
 namespace {
@@ -42,6 +44,8 @@ QStringList GameDiscovery::InstalledGameFiles(const std::function<bool()>& stopR
     QStringList files;
     for (const FolderWalk::WalkedFolder& folder : std::as_const(folders)) {
         const QStringList names = FolderWalk::FilesOf(folder);
+        // The list builder looks for the games' info files and icons in this same listing.
+        m_builder.sideFiles().remember(folder.path, names);
         for (const QString& name : names) {
             if (!GameFileRules::IsDiscoverableExecutable(name))
                 continue;
@@ -73,6 +77,7 @@ DiscoveryResult GameDiscovery::Run(const DiscoveryHooks& hooks)
 {
     DiscoveryResult result;
     m_builder.beginPass();
+    const auto endPass = qScopeGuard([this] { m_builder.endPass(); });
     ListedPaths listedPaths;
 
     // Each item is handed on, then the window may run its events, then the closing flag is looked at.

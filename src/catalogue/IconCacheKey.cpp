@@ -1,39 +1,23 @@
 #include "catalogue/IconCacheKey.h"
 
+#include "i18n/LanguageEncoding.h"
+#include "i18n/modLocalizer.h"
 #include "support/PathFunctions.h"
-
-#include <QStringEncoder>
 
 #include <limits>
 
 namespace Brimvault {
 
-namespace {
-
-QStringEncoder eightBitEncoder()
+int SystemCodePage()
 {
-#ifdef Q_OS_WIN
-    return QStringEncoder(QStringConverter::System);
-#else
-    QStringEncoder encoder("windows-1252");
-    return encoder.isValid() ? std::move(encoder) : QStringEncoder(QStringConverter::Latin1);
-#endif
+    return modLocalizer::CodePageForCharset(modLocalizer::GetSystemCharset());
 }
 
-} // namespace
-
-int EightBitCode(QChar character)
+int EightBitCode(QChar character, int codePage)
 {
-    const char16_t code = character.unicode();
-    if (code < 0x80)
-        return code;
-    static thread_local QStringEncoder encoder = eightBitEncoder();
-    const QByteArray bytes = encoder.encode(QStringView(&character, 1));
-    encoder.resetState();
+    const int code = modLocalizer::EncodeCharacter(character, codePage);
     // A character outside the code page is written as "?", as an 8-bit conversion does.
-    if (bytes.size() != 1 || bytes.at(0) == '?' || bytes.at(0) == '\x1a')
-        return u'?';
-    return static_cast<unsigned char>(bytes.at(0));
+    return code < 0 ? int(u'?') : code;
 }
 
 QString IconCacheKey(const QString& path)
@@ -41,8 +25,12 @@ QString IconCacheKey(const QString& path)
     qint64 odd = 0;
     qint64 even = 0;
     constexpr qint64 limit = std::numeric_limits<qint32>::max();
+    int codePage = 0;
     for (qsizetype i = 0; i < path.size(); ++i) {
-        (i % 2 == 0 ? odd : even) += EightBitCode(path.at(i));
+        const QChar character = path.at(i);
+        if (character.unicode() >= 0x80 && codePage == 0)
+            codePage = SystemCodePage();
+        (i % 2 == 0 ? odd : even) += EightBitCode(character, codePage);
         if (odd > limit || even > limit)
             return QString();
     }

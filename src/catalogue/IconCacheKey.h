@@ -9,9 +9,11 @@ namespace Brimvault {
 // the even positions. "C:\G.exe" gives "G325331". Empty when a sum leaves the signed 32-bit range.
 QString IconCacheKey(const QString& path);
 
-// The 8-bit code of one character: its byte in the system's code page (windows-1252 where the system has
-// no 8-bit code page), "?" for a character the code page cannot write.
-int EightBitCode(QChar character);
+// The code page of the system's character set (1251 for Cyrillic, 1250 for Central European, ...).
+int SystemCodePage();
+
+// The 8-bit code of one character: its byte in the code page, "?" for a character it cannot write.
+int EightBitCode(QChar character, int codePage);
 
 // iconsFolder + IconCacheKey(path) + ".ico"; empty without a folder or a key.
 QString IconCacheFile(const QString& iconsFolder, const QString& path);

@@ -49,6 +49,18 @@ void ListBuilder::beginPass()
     m_addedGames.read();
     m_languageTag = modLocalizer::ShortLanguageName();
     m_knownPaths.clear();
+    m_sideFiles.clear();
+}
+
+void ListBuilder::endPass()
+{
+    m_sideFiles.clear();
+}
+
+QString ListBuilder::findSideFile(const QString& file) const
+{
+    const qsizetype separator = qMax(file.lastIndexOf(u'/'), file.lastIndexOf(u'\\'));
+    return m_sideFiles.find(file.left(separator + 1), file.mid(separator + 1));
 }
 
 GameEntry ListBuilder::OnlineGamesEntry() const
@@ -63,8 +75,11 @@ GameEntry ListBuilder::OnlineGamesEntry() const
 QString ListBuilder::RawDisplayName(const QString& path) const
 {
     QString name = m_addedGames.userName(path);
-    if (name.isEmpty())
-        name = InfoFiles::GameInfoName(path, m_languageTag);
+    if (name.isEmpty()) {
+        const QString found = findSideFile(InfoFiles::GameInfoFileName(path));
+        if (!found.isEmpty())
+            name = InfoFiles::ReadGameName(found, m_languageTag);
+    }
     const QString fileTitle = GetFileName(path, false);
     if (name.isEmpty())
         name = GameNames::BuiltInName(fileTitle);
@@ -78,8 +93,8 @@ QString ListBuilder::RawDisplayName(const QString& path) const
 
 void ListBuilder::chooseIcon(GameEntry& entry) const
 {
-    const QString ownIcon = GetFileFolder(entry.path, true) + QStringLiteral(".ico");
-    const bool hasOwnIcon = QFileInfo(FileSystemPath(ownIcon)).isFile();
+    const QString ownIcon = findSideFile(GetFileFolder(entry.path, true) + QStringLiteral(".ico"));
+    const bool hasOwnIcon = !ownIcon.isEmpty();
     const QString candidate = hasOwnIcon ? ownIcon : IconCacheFile(m_iconsFolder, entry.path);
     QImage picture = pictureOf(candidate);
     if (!picture.isNull()) {

@@ -2,6 +2,7 @@
 
 #include "catalogue/AddedGamesSnapshot.h"
 #include "catalogue/GameEntry.h"
+#include "catalogue/SideFiles.h"
 
 #include <QSet>
 #include <QString>
@@ -16,6 +17,8 @@ public:
 
     // A new list: reads the added games, their user names and the language tag once, forgets the known paths.
     void beginPass();
+    // Forgets the folder listings of the pass, so that files added later are seen.
+    void endPass();
 
     GameEntry OnlineGamesEntry() const;
     // The item for the game; its lower-cased, trimmed path becomes a known path.
@@ -32,15 +35,19 @@ public:
     void setKeepPictures(bool keep) { m_keepPictures = keep; }
 
     AddedGamesSnapshot& addedGames() { return m_addedGames; }
+    SideFiles& sideFiles() { return m_sideFiles; }
     const QString& iconsFolder() const { return m_iconsFolder; }
 
 private:
     void chooseIcon(GameEntry& entry) const;
+    // The file as spelled on disk, found in its folder without regard to case; empty when missing.
+    QString findSideFile(const QString& file) const;
 
     QString m_iconsFolder;
     QString m_languageTag;
     AddedGamesSnapshot m_addedGames;
     QSet<QString> m_knownPaths;
+    mutable SideFiles m_sideFiles;
     bool m_keepPictures = true;
 };
 

@@ -100,4 +100,19 @@ QString DecodeWithCodePageTable(const QByteArray& bytes, int codePage)
     return text;
 }
 
+int EncodeWithCodePageTable(QChar character, int codePage)
+{
+    const char16_t code = character.unicode();
+    if (code < 0x80)
+        return code;
+    const char16_t* table = TableFor(codePage);
+    if (!table)
+        return -1;
+    for (int i = 0; i < 128; ++i) {
+        if (table[i] == code)
+            return 0x80 + i;
+    }
+    return -1;
+}
+
 } // namespace Brimvault::modLocalizer::detail

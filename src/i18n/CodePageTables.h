@@ -12,4 +12,7 @@ bool HasCodePageTable(int codePage);
 // code page leaves undefined map to the control character of the same value, as Windows does.
 QString DecodeWithCodePageTable(const QByteArray& bytes, int codePage);
 
+// The byte of one character in a code page that has a table here, -1 when the code page cannot write it.
+int EncodeWithCodePageTable(QChar character, int codePage);
+
 } // namespace Brimvault::modLocalizer::detail

@@ -3,6 +3,7 @@
 #include "i18n/CodePageTables.h"
 
 #include <QStringDecoder>
+#include <QStringEncoder>
 
 namespace Brimvault::modLocalizer {
 
@@ -93,6 +94,20 @@ QString DecodeCodePage(const QByteArray& bytes, int codePage)
     if (decoder.isValid())
         return decoder.decode(bytes);
     return detail::DecodeWithCodePageTable(bytes, 1252);
+}
+
+int EncodeCharacter(QChar character, int codePage)
+{
+    if (character.unicode() < 0x80 || detail::HasCodePageTable(codePage))
+        return detail::EncodeWithCodePageTable(character, codePage);
+    QStringEncoder encoder(ConverterName(codePage).constData(), QStringConverter::Flag::Stateless);
+    if (!encoder.isValid())
+        return detail::EncodeWithCodePageTable(character, 1252);
+    const QByteArray bytes = encoder.encode(QStringView(&character, 1));
+    // Converters write what they cannot map as "?" or SUB.
+    if (encoder.hasError() || bytes.size() != 1 || bytes.at(0) == '?' || bytes.at(0) == '\x1a')
+        return -1;
+    return static_cast<unsigned char>(bytes.at(0));
 }
 
 QString DecodeLanguageFileBytes(const QByteArray& bytes, int charset)

@@ -17,4 +17,7 @@ QString DecodeLanguageFileBytes(const QByteArray& bytes, int charset);
 // 1250, 1251 and 1252, else as Latin-1. Never fails.
 QString DecodeCodePage(const QByteArray& bytes, int codePage);
 
+// The byte of one character in a single-byte code page, -1 when the code page cannot write it alone.
+int EncodeCharacter(QChar character, int codePage);
+
 } // namespace Brimvault::modLocalizer

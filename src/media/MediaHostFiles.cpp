@@ -21,7 +21,11 @@ QString RuffleScriptPath()
 
 bool RuffleInstalled()
 {
-    return QFileInfo(RuffleHostPagePath()).isFile() && QFileInfo(RuffleScriptPath()).isFile();
+    if (!QFileInfo(RuffleHostPagePath()).isFile() || !QFileInfo(RuffleScriptPath()).isFile())
+        return false;
+    // Ruffle's script cannot start without its WebAssembly.
+    const QDir ruffle = QFileInfo(RuffleScriptPath()).dir();
+    return !ruffle.entryList({QStringLiteral("*.wasm")}, QDir::Files).isEmpty();
 }
 
 QUrl RuffleHostUrl(const QUrl& movie, const QString& catalogueRoot)
@@ -43,7 +47,13 @@ QUrl ContentUrl(const QString& pathOrAddress)
 #ifndef Q_OS_WIN
     path.replace(u'\\', u'/');
 #endif
-    return QUrl::fromLocalFile(QFileInfo(path).absoluteFilePath());
+    const QFileInfo file(path);
+    const bool drivePath = path.size() >= 2 && path.at(1) == u':' && path.at(0).isLetter();
+    if (text.isEmpty() || file.isAbsolute() || drivePath || file.exists())
+        return QUrl::fromLocalFile(file.absoluteFilePath());
+    // What is neither a path nor an existing file is an address without its scheme ("www.example.com/offer"),
+    // as the browser takes it.
+    return QUrl::fromUserInput(text);
 }
 
 bool WebEngineAvailable()

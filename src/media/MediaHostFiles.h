@@ -5,7 +5,8 @@
 
 namespace Brimvault::MediaHostFiles {
 
-// Ruffle and our page that hosts it lie beside the program: ruffle-host.html and ruffle/ruffle.js.
+// Ruffle and our page that hosts it lie beside the program: ruffle-host.html, ruffle/ruffle.js and Ruffle's
+// WebAssembly beside its script.
 QString RuffleHostPagePath();
 QString RuffleScriptPath();
 bool RuffleInstalled();
@@ -14,8 +15,8 @@ bool RuffleInstalled();
 // page address.
 QUrl RuffleHostUrl(const QUrl& movie, const QString& catalogueRoot);
 
-// A movie or page given as a path or an address: addresses stay as they are, paths (also with "\")
-// become file URLs.
+// A movie or page given as a path or an address: addresses stay as they are, paths (also with "\") and
+// existing files become file URLs, anything else is a web address without its scheme.
 QUrl ContentUrl(const QString& pathOrAddress);
 
 // Whether the web engine's helper process is where the engine will look for it.

@@ -233,6 +233,11 @@ QWebEngineView* frmReclama::createFlashHost()
     m_flash->setObjectName(QStringLiteral("oFlash"));
     m_flash->setPage(new FlashHostPage(m_flash));
     connect(m_flash, &QWebEngineView::loadFinished, this, &frmReclama::onFlashHostLoaded);
+    connect(m_flash, &QWebEngineView::titleChanged, this, [this](const QString& title) {
+        // Ruffle failed to start (its WebAssembly missing or broken) long after the page loaded.
+        if (title == u"brimvault:failed" || title == u"brimvault:no-ruffle")
+            reportFlashMissing();
+    });
     return m_flash;
 }
 
@@ -240,21 +245,30 @@ void frmReclama::onFlashHostLoaded(bool ok)
 {
     if (!m_flash)
         return;
-    const auto reportMissing = [window = QPointer<frmReclama>(this)] {
-        showMissingControl(QStringLiteral("Macromedia Shockwave Flash Control not installed properly."));
-        if (window)
-            window->close();
-    };
     if (!ok) {
-        reportMissing();
+        reportFlashMissing();
         return;
     }
     m_flash->page()->runJavaScript(QStringLiteral("window.brimvault ? window.brimvault.state : 'no-host'"),
-        [reportMissing](const QVariant& state) {
+        [window = QPointer<frmReclama>(this)](const QVariant& state) {
             const QString text = state.toString();
-            if (text == u"no-ruffle" || text == u"no-host")
-                reportMissing();
+            if (window && (text == u"no-ruffle" || text == u"no-host"))
+                window->reportFlashMissing();
         });
+}
+
+void frmReclama::reportFlashMissing()
+{
+    // Once per window: the page may report the failure in more than one way.
+    if (m_flashReported)
+        return;
+    m_flashReported = true;
+    m_mode = ModeNothing;
+    // The message is all the user sees, not Ruffle's own error drawn in the player.
+    if (m_flash)
+        m_flash->hide();
+    showMissingControl(QStringLiteral("Macromedia Shockwave Flash Control not installed properly."));
+    close();
 }
 
 void frmReclama::removeHostedControls()

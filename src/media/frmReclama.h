@@ -63,6 +63,7 @@ private:
     void layoutControls();
     void openWithShell(const QString& target);
     void onFlashHostLoaded(bool ok);
+    void reportFlashMissing();
     void finishShowing(bool failed, bool maximized);
 
     int m_mode = ModeNothing;
@@ -79,6 +80,7 @@ private:
     QToolButton* m_goBack = nullptr;
     // Animated GIF advertisements; m_picture then holds the current frame.
     QMovie* m_animation = nullptr;
+    bool m_flashReported = false;
 };
 
 } // namespace Brimvault

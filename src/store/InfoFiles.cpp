@@ -34,9 +34,14 @@ QString GameInfoFileName(const QString& gamePath)
 
 QString GameInfoName(const QString& gamePath, const QString& lngNik)
 {
+    return ReadGameName(GameInfoFileName(gamePath), lngNik);
+}
+
+QString ReadGameName(const QString& infoFile, const QString& lngNik)
+{
     // A missing info file, or a folder in its place, reads as an empty bag.
     clsFileBag bag;
-    bag.OpenFile(GameInfoFileName(gamePath));
+    bag.OpenFile(infoFile);
     const QString localised = recordValue(bag, CatalogueKeys::NameRecord + u'_' + lngNik);
     return localised.isEmpty() ? recordValue(bag, CatalogueKeys::NameRecord) : localised;
 }
@@ -51,7 +56,11 @@ QString DirInfoFileName(const QString& folder)
 
 bool IsStopFolder(const QString& folder)
 {
-    const QString infoFile = DirInfoFileName(folder);
+    return IsStopMark(DirInfoFileName(folder));
+}
+
+bool IsStopMark(const QString& infoFile)
+{
     if (!BagFileIo::isFile(infoFile))
         return false;
     clsFileBag bag;

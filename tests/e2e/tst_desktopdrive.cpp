@@ -3,6 +3,7 @@
 // service, games are renamed and removed, the language changes, and closing shows the advertisement.
 #include "DesktopDriver.h"
 #include "DriveLibrary.h"
+#include "RuffleFixture.h"
 #include "TestEnvironment.h"
 #include "XvfbServer.h"
 #include "catalogue/IconCacheKey.h"
@@ -361,6 +362,7 @@ private Q_SLOTS:
 
     void flashMovieOpensInTheMediaHost()
     {
+        REQUIRE_RUFFLE();
         const qsizetype index = DriveLibrary::IndexOfPath(discovered(), m_flashMovie);
         QVERIFY(index > 0);
         QVERIFY(m_desktop->doubleClick(ListPicture::IconCentre(listOrigin(), int(index))));

@@ -1,3 +1,4 @@
+#include "RuffleFixture.h"
 #include "SwfBuilder.h"
 #include "TestEnvironment.h"
 
@@ -353,6 +354,7 @@ private Q_SLOTS:
 
     void flashMovieIsPlayedByRuffle()
     {
+        REQUIRE_RUFFLE();
         SwfBuilder movie(8, 550, 400, 24.0);
         movie.setBackgroundColor(0x12, 0x34, 0x56);
         // The movie asks for its page address and hands the answer back to the page.
@@ -401,6 +403,7 @@ private Q_SLOTS:
 
     void movieOpeningAPageHandsItToTheBrowser()
     {
+        REQUIRE_RUFFLE();
         SwfBuilder movie(8, 100, 100, 12.0);
         movie.doAction(SwfBuilder::getUrl("http://127.0.0.1:9/more-games", "_blank"));
         movie.showFrame();

@@ -1,0 +1,53 @@
+#include "catalogue/SideFiles.h"
+
+#include "catalogue/FolderWalk.h"
+#include "store/CatalogueKeys.h"
+
+namespace Brimvault {
+
+namespace {
+
+bool isSideFile(const QString& name)
+{
+    return name.endsWith(CatalogueKeys::InfoFileExtension, Qt::CaseInsensitive)
+        || name.endsWith(QLatin1String(".ico"), Qt::CaseInsensitive);
+}
+
+} // namespace
+
+void SideFiles::remember(const QString& folder, const QStringList& files)
+{
+    QStringList& names = m_folders[folder];
+    names.clear();
+    for (const QString& file : files) {
+        if (isSideFile(file))
+            names.append(file);
+    }
+}
+
+QString SideFiles::find(const QString& folder, const QString& name)
+{
+    auto known = m_folders.constFind(folder);
+    if (known == m_folders.constEnd()) {
+        remember(folder, FolderWalk::ListFolder(folder).files);
+        known = m_folders.constFind(folder);
+    }
+    const QString match = matchName(*known, name);
+    return match.isEmpty() ? QString() : folder + match;
+}
+
+QString SideFiles::matchName(const QStringList& files, const QString& name)
+{
+    QString match;
+    for (const QString& file : files) {
+        if (file.compare(name, Qt::CaseInsensitive) != 0)
+            continue;
+        if (file == name)
+            return file;
+        if (match.isEmpty())
+            match = file;
+    }
+    return match;
+}
+
+} // namespace Brimvault
