@@ -7,7 +7,8 @@
 #include <QStringList>
 #include <utility>
 
-// Reads what the launch recorder wrote: one entry per start of a program copied from it.
+// What the launch recorder (tests/gameactions/launchrecorder.cpp) wrote: one entry per start of a program
+// copied from it, in <folder>/<program file name>.record.
 struct LaunchRecord {
     QString program;
     QString workingFolder;
