@@ -6,7 +6,10 @@
 #include <QMenu>
 #include <QTest>
 
+#include "TestSuite.h"
+
 using namespace Brimvault;
+using namespace Qt::StringLiterals;
 
 class TestFormScaling : public QObject {
     Q_OBJECT
@@ -62,7 +65,7 @@ private Q_SLOTS:
         QCOMPARE(label->geometry(), QRect(25, 50, 125, 38));
 
         FormScaling::ScaleForm(&form, FormScaling::ScreenFactors(at120));
-        QCOMPARE(label->geometry(), FormScaling::TwipsToPixels(designTwips, {15.0, 15.0}));
+        QCOMPARE(label->geometry(), QRect(20, 40, 100, 30));
         QCOMPARE(form.size(), QSize(400, 300));
         QCOMPARE(label->font().pointSizeF(), 8.0);
     }
@@ -112,5 +115,11 @@ private Q_SLOTS:
     }
 };
 
-QTEST_MAIN(TestFormScaling)
+BV_REGISTER_TEST(TestFormScaling);
+
+// The main window's parts that run without the window: form scaling, the dialog library, the language dialog.
+int main(int argc, char** argv)
+{
+    return RunRegisteredTests(argc, argv);
+}
 #include "tst_formscaling.moc"
