@@ -87,16 +87,6 @@ private Q_SLOTS:
         m_prompts.reset();
     }
 
-    void captionsAreLocalised()
-    {
-        QPointer<frmReclama> window = new frmReclama();
-        QCOMPARE(window->windowTitle(), u"Advertising"_s);
-        window->SetOnlineGamesCaption();
-        QCOMPARE(window->windowTitle(), u"Online games"_s);
-        window->close();
-        QTRY_VERIFY(window.isNull());
-    }
-
     void webPageNavigatesAndGoesBack()
     {
         const QString second = page(u"second.html"_s, "<p>second</p>");

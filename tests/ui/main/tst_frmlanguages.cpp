@@ -91,10 +91,10 @@ private Q_SLOTS:
         QTest::addColumn<QString>("stored");
         QTest::addColumn<int>("selected");
         QTest::newRow("nothing stored") << QString() << 0;
-        QTest::newRow("built-in language") << "English (Default)" << 0;
-        QTest::newRow("Russian") << "Brimvault_Russian.lng" << 2;
-        QTest::newRow("other letter case") << "brimvault_polish.LNG" << 1;
-        QTest::newRow("file no longer there") << "Brimvault_German.lng" << 0;
+        QTest::newRow("built-in language") << u"English (Default)"_s << 0;
+        QTest::newRow("Russian") << u"Brimvault_Russian.lng"_s << 2;
+        QTest::newRow("other letter case") << u"brimvault_polish.LNG"_s << 1;
+        QTest::newRow("file no longer there") << u"Brimvault_German.lng"_s << 0;
     }
     void preselectsTheLanguageInForce()
     {

@@ -162,33 +162,25 @@ private Q_SLOTS:
         QCOMPARE(captions(), english);
     }
 
-    void actionsButtonsOpenTheActionsMenu_data()
-    {
-        QTest::addColumn<QString>("button");
-        QTest::newRow("label") << u"labActions"_s;
-        QTest::newRow("image") << u"imgActions"_s;
-    }
-    void actionsButtonsOpenTheActionsMenu()
-    {
-        QFETCH(QString, button);
-        auto window = openWindow();
-        QTest::mouseClick(window->findChild<ClickLabel*>(button), Qt::LeftButton);
-        QTRY_VERIFY(window->mnuActions()->isVisible());
-        QCOMPARE(menuLayout(window->mnuActions()),
-            u"mnuAddFile mnuAddFolder mnuInstall - mnuGetMoreGames - mnuActionRemoveFile mnuActionRemoveAllFiles - "
-            "mnuLanguage - mnuHelp - mnuAbout"_s);
-        window->mnuActions()->hide();
-    }
-
-    void rightClickOpensTheItemMenuOnTheClickedItem()
+    void menusOpenFromTheirButtonsAndOnRightClick()
     {
         BuildSampleLibrary(*m_env);
         auto window = openWindow();
-        SimpleListView* list = window->ListView1();
+        for (const char* button : {"labActions", "imgActions"}) {
+            QTest::mouseClick(window->findChild<ClickLabel*>(QString::fromLatin1(button)), Qt::LeftButton);
+            QTRY_VERIFY(window->mnuActions()->isVisible());
+            window->mnuActions()->hide();
+        }
+        QCOMPARE(menuLayout(window->mnuActions()),
+            u"mnuAddFile mnuAddFolder mnuInstall - mnuGetMoreGames - mnuActionRemoveFile mnuActionRemoveAllFiles - "
+            "mnuLanguage - mnuHelp - mnuAbout"_s);
         QCOMPARE(menuLayout(window->mnuItemPopup()), u"mnuOpenGame - mnuRenameGame mnuRemoveFile"_s);
+
+        // A right click selects the item and opens the item menu after a short timer; a left click opens nothing.
+        SimpleListView* list = window->ListView1();
         QTest::mouseClick(list, Qt::RightButton, {}, list->imgN(2).geometry().center().toPoint());
         QCOMPARE(list->currentIndex(), 2);
-        QVERIFY(!window->mnuItemPopup()->isVisible()); // it opens after a short timer
+        QVERIFY(!window->mnuItemPopup()->isVisible());
         QTRY_VERIFY(window->mnuItemPopup()->isVisible());
         window->mnuItemPopup()->hide();
         QTest::mouseClick(list, Qt::LeftButton, {}, list->imgN(1).geometry().center().toPoint());
@@ -340,25 +332,19 @@ private Q_SLOTS:
         QCOMPARE(rebuilt.count(), 1);
     }
 
-    void helpFollowsTheLanguage_data()
-    {
-        QTest::addColumn<QString>("languageFile");
-        QTest::addColumn<QString>("helpFile"); // empty: the built-in language's page
-        QTest::newRow("built-in language") << QString() << QString();
-        QTest::newRow("Russian") << u"Brimvault_Russian.lng"_s << u"Brimvault_Russian.html"_s;
-    }
     void helpFollowsTheLanguage()
     {
-        QFETCH(QString, languageFile);
-        QFETCH(QString, helpFile);
         frmMain window;
-        modLocalizer::SwitchLanguage(languageFile.isEmpty() ? QString() : m_program->path() + u'/' + languageFile);
-        const QString expected
-            = helpFile.isEmpty() ? m_program->builtInHelpFile() : m_program->path() + u'/' + helpFile;
-        QVERIFY(QFileInfo::exists(expected));
-        UrlCatcher catcher;
-        window.menuItem(u"mnuHelp"_s)->trigger();
-        QCOMPARE(catcher.opened, QList<QUrl> {QUrl::fromLocalFile(expected)});
+        for (const QString& language : {u"Brimvault_Russian"_s, QString()}) {
+            modLocalizer::SwitchLanguage(
+                language.isEmpty() ? QString() : m_program->path() + u'/' + language + u".lng"_s);
+            const QString page
+                = language.isEmpty() ? m_program->builtInHelpFile() : m_program->path() + u'/' + language + u".html"_s;
+            QVERIFY(QFileInfo::exists(page));
+            UrlCatcher catcher;
+            window.menuItem(u"mnuHelp"_s)->trigger();
+            QCOMPARE(catcher.opened, QList<QUrl> {QUrl::fromLocalFile(page)});
+        }
     }
 
     void moreGamesAndAboutThroughTheDialogLibrary()

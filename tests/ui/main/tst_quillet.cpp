@@ -45,18 +45,12 @@ private Q_SLOTS:
         QTest::addColumn<QString>("progId");
         QTest::addColumn<QString>("method");
         QTest::addColumn<int>("argumentCount");
-        QTest::newRow("CenterForm") << "Quillet.clsFormFuncs"
-                                    << "CenterForm" << 1;
-        QTest::newRow("ShowOpenSaveDialog") << "Quillet.CComDlg"
-                                            << "ShowOpenSaveDialog" << 7;
-        QTest::newRow("BrowseForFolder") << "Quillet.CComDlg"
-                                         << "BrowseForFolder" << 3;
-        QTest::newRow("ShowAbout") << "Quillet.clsAbout"
-                                   << "ShowAbout" << 0;
-        QTest::newRow("GetHelp") << "Quillet.clsGetHelp"
-                                 << "GetHelp" << 1;
-        QTest::newRow("ProgID in other letter case") << "quillet.CLSGETHELP"
-                                                     << "gethelp" << 1;
+        QTest::newRow("CenterForm") << u"Quillet.clsFormFuncs"_s << u"CenterForm"_s << 1;
+        QTest::newRow("ShowOpenSaveDialog") << u"Quillet.CComDlg"_s << u"ShowOpenSaveDialog"_s << 7;
+        QTest::newRow("BrowseForFolder") << u"Quillet.CComDlg"_s << u"BrowseForFolder"_s << 3;
+        QTest::newRow("ShowAbout") << u"Quillet.clsAbout"_s << u"ShowAbout"_s << 0;
+        QTest::newRow("GetHelp") << u"Quillet.clsGetHelp"_s << u"GetHelp"_s << 1;
+        QTest::newRow("ProgID in other letter case") << u"quillet.CLSGETHELP"_s << u"gethelp"_s << 1;
     }
     void methodsCallableByName()
     {
@@ -116,8 +110,8 @@ private Q_SLOTS:
     void cancelledDialogsAnswerEmpty_data()
     {
         QTest::addColumn<QString>("method");
-        QTest::newRow("open file") << "ShowOpenSaveDialog";
-        QTest::newRow("folder") << "BrowseForFolder";
+        QTest::newRow("open file") << u"ShowOpenSaveDialog"_s;
+        QTest::newRow("folder") << u"BrowseForFolder"_s;
     }
     void cancelledDialogsAnswerEmpty()
     {
@@ -197,10 +191,10 @@ private Q_SLOTS:
     {
         QTest::addColumn<QString>("argument");
         QTest::addColumn<QUrl>("expected");
-        QTest::newRow("help file") << "HELPFILE" << QUrl();
-        QTest::newRow("address") << "https://example.org/help.html" << QUrl(u"https://example.org/help.html"_s);
+        QTest::newRow("help file") << u"HELPFILE"_s << QUrl();
+        QTest::newRow("address") << u"https://example.org/help.html"_s << QUrl(u"https://example.org/help.html"_s);
         QTest::newRow("more games, blanks around")
-            << "  BrimvaultMoreGames " << QUrl(u"http://127.0.0.1:9/more-games.asp?product=Brimvault"_s);
+            << u"  BrimvaultMoreGames "_s << QUrl(u"http://127.0.0.1:9/more-games.asp?product=Brimvault"_s);
     }
     void getHelpOpensInTheBrowser()
     {
