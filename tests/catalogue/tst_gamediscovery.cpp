@@ -57,17 +57,6 @@ private Q_SLOTS:
     }
     void cleanup() { m_env.reset(); }
 
-    void onlyTheOnlineEntry()
-    {
-        const Run run = discover();
-        QCOMPARE(run.clears, 1);
-        QCOMPARE(run.entries.size(), 1);
-        QCOMPARE(run.entries.first().source, IconSource::Online);
-        QCOMPARE(run.result.items, 1);
-        QCOMPARE(run.result.queuedIcons, 0);
-        QVERIFY(!run.result.stopped);
-    }
-
     void installedGames()
     {
         const QString g = u"commonappdata/Brimvault/"_s;

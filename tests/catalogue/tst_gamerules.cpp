@@ -10,69 +10,54 @@ using namespace Qt::StringLiterals;
 class TestGameRules : public QObject {
     Q_OBJECT
 private Q_SLOTS:
-    void tidyName_data()
+    // Names: the tidied caption, the built-in zone table, the icon cache key ("" when not applicable).
+    void names_data()
     {
-        QTest::addColumn<QString>("name");
+        QTest::addColumn<char>("rule"); // t: tidied name, b: built-in name, k: cache key
+        QTest::addColumn<QString>("input");
         QTest::addColumn<QString>("expected");
         const QString prefix = u"Исполняемый файл для игры"_s;
-        QTest::newRow("russian prefix cut") << prefix + u" Chess"_s << u"Chess"_s;
-        QTest::newRow("prefix elsewhere kept") << u"A "_s + prefix << u"A "_s + prefix;
-        QTest::newRow("prefix without blank kept") << prefix << prefix;
-        QTest::newRow("12 unbroken") << u"ABCDEFGHIJKL"_s << u"ABCDEFGHIJKL"_s;
-        QTest::newRow("13 broken after 12") << u"ABCDEFGHIJKLM"_s << u"ABCDEFGHIJKL M"_s;
-        QTest::newRow("24 one break") << u"ABCDEFGHIJKLMNOPQRSTUVWX"_s << u"ABCDEFGHIJKL MNOPQRSTUVWX"_s;
-        QTest::newRow("25 second break") << u"ABCDEFGHIJKLMNOPQRSTUVWXY"_s << u"ABCDEFGHIJKL MNOPQRSTUVWX Y"_s;
-        QTest::newRow("blanks unbroken") << u"Solitaire Collection Deluxe"_s << u"Solitaire Collection Deluxe"_s;
-        QTest::newRow("30 kept") << u"Thirty characters long name ok"_s << u"Thirty characters long name ok"_s;
-        QTest::newRow("31 cut") << u"Thirty-one characters long name"_s << u"Thirty-one characters long nam..."_s;
-        QTest::newRow("40 broken and cut")
-            << u"ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmn"_s << u"ABCDEFGHIJKL MNOPQRSTUVWX YZabcd..."_s;
-        QTest::newRow("prefix then cut") << prefix + u' ' + QString(31, u'x')
-                                         << u"xxxxxxxxxxxx xxxxxxxxxxxx xxxxxx..."_s;
-        QTest::newRow("empty") << QString() << QString();
-    }
-    void tidyName()
-    {
-        QFETCH(QString, name);
-        QTEST(GameNames::TidyName(name), "expected");
-    }
-
-    void builtInName_data()
-    {
-        QTest::addColumn<QString>("title");
-        QTest::addColumn<QString>("expected");
-        QTest::newRow("zone hearts") << u"hrtzzm"_s << u"Internet Chervi"_s;
-        QTest::newRow("zone any case") << u"RVSEZM"_s << u"Internet Reversi"_s;
-        QTest::newRow("zone backgammon") << u"bckgzm"_s << u"Internet Nardi"_s;
-        QTest::newRow("member without row") << u"zm"_s << QString();
-        QTest::newRow("publisher game, built-in language") << u"sudoku"_s << QString();
-    }
-    void builtInName()
-    {
-        QFETCH(QString, title);
-        QTEST(GameNames::BuiltInName(title), "expected");
-    }
-
-    void iconCacheKey_data()
-    {
-        QTest::addColumn<QString>("path");
-        QTest::addColumn<QString>("expected");
-        QTest::newRow("worked example") << u"C:\\G.exe"_s << u"G325331"_s;
+        QTest::newRow("russian prefix cut") << 't' << prefix + u" Chess"_s << u"Chess"_s;
+        QTest::newRow("prefix elsewhere kept") << 't' << u"A "_s + prefix << u"A "_s + prefix;
+        QTest::newRow("prefix without blank kept") << 't' << prefix << prefix;
+        QTest::newRow("12 unbroken") << 't' << u"ABCDEFGHIJKL"_s << u"ABCDEFGHIJKL"_s;
+        QTest::newRow("13 broken after 12") << 't' << u"ABCDEFGHIJKLM"_s << u"ABCDEFGHIJKL M"_s;
+        QTest::newRow("24 one break") << 't' << u"ABCDEFGHIJKLMNOPQRSTUVWX"_s << u"ABCDEFGHIJKL MNOPQRSTUVWX"_s;
+        QTest::newRow("25 second break") << 't' << u"ABCDEFGHIJKLMNOPQRSTUVWXY"_s << u"ABCDEFGHIJKL MNOPQRSTUVWX Y"_s;
+        QTest::newRow("blanks unbroken") << 't' << u"Solitaire Collection Deluxe"_s << u"Solitaire Collection Deluxe"_s;
+        QTest::newRow("30 kept") << 't' << u"Thirty characters long name ok"_s << u"Thirty characters long name ok"_s;
+        QTest::newRow("31 cut") << 't' << u"Thirty-one characters long name"_s
+                                << u"Thirty-one characters long nam..."_s;
+        QTest::newRow("prefix, break, cut")
+            << 't' << prefix + u' ' + QString(40, u'x') << u"xxxxxxxxxxxx xxxxxxxxxxxx xxxxxx..."_s;
+        QTest::newRow("zone hearts") << 'b' << u"hrtzzm"_s << u"Internet Chervi"_s;
+        QTest::newRow("zone any case") << 'b' << u"RVSEZM"_s << u"Internet Reversi"_s;
+        QTest::newRow("zone backgammon") << 'b' << u"bckgzm"_s << u"Internet Nardi"_s;
+        QTest::newRow("member without row") << 'b' << u"zm"_s << QString();
+        QTest::newRow("publisher game, built-in language") << 'b' << u"sudoku"_s << QString();
+        QTest::newRow("worked example") << 'k' << u"C:\\G.exe"_s << u"G325331"_s;
         // Odd positions C \ . x = 67+92+46+120, even : G e e with "g" 103 instead of 71.
-        QTest::newRow("sums use the path as given") << u"C:\\g.exe"_s << u"G325363"_s;
-        QTest::newRow("unix path") << u"/a/b.exe"_s << u"B260397"_s;
-        QTest::newRow("no extension") << u"ab"_s << u"AB9798"_s;
-        QTest::newRow("eight-bit code") << u"é"_s << u"É2330"_s;
-        QTest::newRow("outside the code page") << u"ж"_s << u"Ж630"_s;
-        QTest::newRow("empty") << QString() << u"00"_s;
+        QTest::newRow("sums use the path as given") << 'k' << u"C:\\g.exe"_s << u"G325363"_s;
+        QTest::newRow("unix path") << 'k' << u"/a/b.exe"_s << u"B260397"_s;
+        QTest::newRow("no extension") << 'k' << u"ab"_s << u"AB9798"_s;
+        QTest::newRow("eight-bit code") << 'k' << u"é"_s << u"É2330"_s;
+        QTest::newRow("outside the code page") << 'k' << u"ж"_s << u"Ж630"_s;
+        QTest::newRow("empty") << 'k' << QString() << u"00"_s;
     }
-    void iconCacheKey()
+    void names()
     {
-        QFETCH(QString, path);
+        QFETCH(char, rule);
+        QFETCH(QString, input);
         QFETCH(QString, expected);
-        QCOMPARE(IconCacheKey(path), expected);
-        QCOMPARE(IconCacheFile(u"/c/Icons/"_s, path), u"/c/Icons/"_s + expected + u".ico"_s);
-        QVERIFY(IconCacheFile(QString(), path).isEmpty());
+        if (rule == 't')
+            QCOMPARE(GameNames::TidyName(input), expected);
+        if (rule == 'b')
+            QCOMPARE(GameNames::BuiltInName(input), expected);
+        if (rule != 'k')
+            return;
+        QCOMPARE(IconCacheKey(input), expected);
+        QCOMPARE(IconCacheFile(u"/c/Icons/"_s, input), u"/c/Icons/"_s + expected + u".ico"_s);
+        QVERIFY(IconCacheFile(QString(), input).isEmpty());
     }
 
     void gameFileNames_data()
