@@ -50,7 +50,6 @@ private Q_SLOTS:
         for (const char* prefix : {"Quillet", "Tamarisk", "Velloran", "Ostrane", "Corvelle"})
             QTest::newRow(prefix) << QString::fromLatin1(prefix);
     }
-
     void registerThenCreate()
     {
         QFETCH(QString, prefix);
@@ -139,7 +138,6 @@ private Q_SLOTS:
         QTest::newRow("QObject's own property")
             << u"objectName"_qs << QVariantList {} << CallType::Get << false << QVariant();
     }
-
     void callByName()
     {
         QFETCH(QString, method);

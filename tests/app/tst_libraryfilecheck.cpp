@@ -50,7 +50,6 @@ private Q_SLOTS:
         damaged.replace(56, 2, "\xff\xff");
         QTest::newRow("more program headers than the file holds") << damaged << false;
     }
-
     void libraryFiles()
     {
         QFETCH(QByteArray, bytes);

@@ -64,7 +64,6 @@ private Q_SLOTS:
         QTest::newRow("built-in, forced") << false << true << u"Program language"_qs;
         QTest::newRow("file, not forced") << true << false << u"Язык программы"_qs;
     }
-
     void applyLanguage()
     {
         QFETCH(bool, fileLanguage);

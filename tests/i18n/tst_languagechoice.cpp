@@ -82,7 +82,6 @@ private Q_SLOTS:
             << QString() << "ru_RU"_qba << u"Brimvault_Broken.lng:204:repeated"_qs << u"Russian"_qs << u"RUSSIAN"_qs
             << u"Brimvault_Russian.lng RUSSIAN"_qs;
     }
-
     void startUpChoice()
     {
         QFETCH(QString, stored);
@@ -127,7 +126,6 @@ private Q_SLOTS:
         QTest::newRow("unusable file") << u"Brimvault_Broken.lng"_qs << u"Brimvault_Broken.lng BROKEN"_qs
                                        << u"English (Default)"_qs;
     }
-
     void chooseLanguageFile()
     {
         QFETCH(QString, fileName);
@@ -182,7 +180,6 @@ private Q_SLOTS:
         for (const auto& [locale, charset] : locales)
             QTest::newRow(locale) << QByteArray(locale) << charset;
     }
-
     void systemCharset()
     {
         QFETCH(QByteArray, locale);

@@ -28,7 +28,6 @@ private Q_SLOTS:
         QTest::newRow("Russian") << u"Brimvault_Russian.lng"_qs << u"Русский"_qs << 204 << u"Язык программы"_qs;
         QTest::newRow("Polish") << u"Brimvault_Polish.lng"_qs << u"Polski"_qs << 238 << u"Język programu"_qs;
     }
-
     void shippedFile()
     {
         QFETCH(QString, fileName);

@@ -42,7 +42,6 @@ private Q_SLOTS:
         QTest::newRow("leading zero is another key") << QByteArray("@030=x") << u"default"_qs;
         QTest::newRow("setting syntax is not a text") << QByteArray("#30=x") << u"default"_qs;
     }
-
     void textLines()
     {
         QFETCH(QByteArray, line);
@@ -67,7 +66,6 @@ private Q_SLOTS:
         QTest::newRow("unknown setting passed over")
             << QByteArray("#language=T\r\n#charset=204\r\n#author=me\r\n") << u"T"_qs << 204;
     }
-
     void settingLines()
     {
         QFETCH(QByteArray, content);
@@ -86,7 +84,7 @@ private Q_SLOTS:
         QTest::addColumn<QByteArray>("content");
         const QByteArray header = "#language=Test\r\n#charset=204\r\n";
         QTest::newRow("missing file") << QByteArray();
-        QTest::newRow("repeated key") << header + "@725=A\r\n@725=B\r\n";
+        QTest::newRow("repeated key, apart") << header + "@725=A\r\n@10=x\r\n@725=B\r\n";
         QTest::newRow("repeated key, blanks around") << header + "@725=A\r\n@ 725 =B\r\n";
         QTest::newRow("repeated key, letter case") << header + "@7a=A\r\n@7A=B\r\n";
         QTest::newRow("no charset") << QByteArray("#language=Test\r\n@725=A\r\n");
@@ -102,7 +100,6 @@ private Q_SLOTS:
         QTest::newRow("lone markers") << QByteArray("#\r\n@\r\n=\r\n#=\r\n@=\r\n#language\r\n#charset\r\n");
         QTest::newRow("over 16 MB") << header + "@725=A\r\n" + QByteArray(16 * 1024 * 1024, ';');
     }
-
     void rejectedFilesLeaveBuiltInLanguage()
     {
         QFETCH(QByteArray, content);
@@ -142,7 +139,6 @@ private Q_SLOTS:
         QTest::newRow("escapes after replacing") << u"aXb"_qs << QStringList {u"X"_qs, u"|n"_qs} << u"a\r\nb"_qs;
         QTest::newRow("tab before line break") << u"||n|t"_qs << QStringList() << u"|\r\n\t"_qs;
     }
-
     void replacements()
     {
         QFETCH(QString, text);
@@ -196,7 +192,6 @@ private Q_SLOTS:
         QTest::newRow("8 MB line") << QByteArray("#language=H\r\n#charset=204\r\n@10=") + QByteArray(8 << 20, 'x')
                                    << QString(8 << 20, u'x');
     }
-
     void decoding()
     {
         QFETCH(QByteArray, content);

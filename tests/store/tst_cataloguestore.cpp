@@ -68,7 +68,6 @@ private Q_SLOTS:
         QTest::newRow("entry at the largest number")
             << u"5"_qs << QStringList {u"File2147483647"_qs, u"File1"_qs} << u"File2"_qs << u"2147483647"_qs;
     }
-
     void damagedCounter()
     {
         QFETCH(QString, count);
@@ -94,7 +93,6 @@ private Q_SLOTS:
         QTest::newRow("blanks") << u" count "_qs << 1;
         QTest::newRow("Counter is an entry") << u"Counter"_qs << 2;
     }
-
     void counterIsSkipped()
     {
         QFETCH(QString, counterKey);
@@ -115,7 +113,6 @@ private Q_SLOTS:
         QTest::newRow("non-ASCII case") << u"/ИГРЫ/линии.EXE"_qs << u"File4"_qs;
         QTest::newRow("inner blank differs") << u"C:\\Games\\Li nes.exe"_qs << QString();
     }
-
     void pathLookup()
     {
         QFETCH(QString, lookedUp);
@@ -143,7 +140,6 @@ private Q_SLOTS:
         QTest::newRow("root folder") << u"/x.exe"_qs << u"/x.bvxinf"_qs;
         QTest::newRow("name is extension only") << u"dir\\.hidden"_qs << u"dir\\.bvxinf"_qs;
     }
-
     void gameInfoFileName()
     {
         QFETCH(QString, gamePath);
@@ -167,7 +163,6 @@ private Q_SLOTS:
         QTest::newRow("escaped value") << QByteArray("<>Name<A \\{[}\\B\\{]}\\") << u"ENG"_qs << u"A <B>"_qs;
         QTest::newRow("no records") << QByteArray("just text") << u"ENG"_qs << QString();
     }
-
     void gameInfoName()
     {
         QFETCH(QByteArray, content);
@@ -193,7 +188,6 @@ private Q_SLOTS:
         QTest::newRow("No") << QByteArray("<>StopDir<No") << false;
         QTest::newRow("empty file") << QByteArray() << false;
     }
-
     void stopFolder()
     {
         QFETCH(QByteArray, content);
@@ -215,7 +209,6 @@ private Q_SLOTS:
         QTest::newRow("empty") << QString();
         QTest::newRow("blank") << u"   "_qs;
     }
-
     void dataFolders()
     {
         QFETCH(QString, commonAppData);

@@ -100,7 +100,6 @@ private Q_SLOTS:
         QTest::newRow("count, key on last line") << count(u"<>a<1\r\nx\r\n<>c"_qs) << u"2"_qs;
         QTest::newRow("count, lone key") << count(u"<"_qs) << u"0"_qs;
     }
-
     void calls()
     {
         QFETCH(QString, actual);
@@ -127,7 +126,6 @@ private Q_SLOTS:
         QTest::newRow("two parts") << u"<>ads<>>URL<http://x/"_qs << u"<>ads<>>url<"_qs << u"<>ads<>>URL<http://x/"_qs
                                    << u"http://x/"_qs;
     }
-
     void lookup()
     {
         QFETCH(QString, text);
@@ -164,7 +162,6 @@ private Q_SLOTS:
         QTest::newRow("remove adjacent") << u"<>b<0\r\n<>a<1\r\n<>a<2\r\n<>b<3"_qs << u"remove all"_qs << u"<>a<"_qs
                                          << u"<>b<0\r\n<>b<3"_qs;
     }
-
     void edits()
     {
         QFETCH(QString, text);
@@ -189,7 +186,6 @@ private Q_SLOTS:
         QTest::newRow("line end as key") << u"a\r\n\r\nb"_qs << u"\r\n"_qs;
         QTest::newRow("key across lines") << u"<>a<1\r\n<>b<2"_qs << u"1\r\n<"_qs;
     }
-
     void oddKeysTerminate()
     {
         QFETCH(QString, text);
@@ -246,7 +242,6 @@ private Q_SLOTS:
         QByteArray huge(8 * 1024 * 1024, 'x');
         QTest::newRow("huge line") << huge + "<>b<" << QString::fromLatin1(huge + "<>b<");
     }
-
     void openFile()
     {
         QFETCH(QByteArray, bytes);
@@ -288,7 +283,6 @@ private Q_SLOTS:
         QTest::newRow("endless device") << u"/dev/zero"_qs;
         QTest::newRow("65 MB file") << u"huge"_qs;
     }
-
     void notAPlainFile()
     {
         QFETCH(QString, kind);
@@ -343,7 +337,6 @@ private Q_SLOTS:
         QTest::newRow("backslash") << bs("\\new\\game.bvxinf") << true;
         QTest::newRow("two levels missing") << u"/new/deeper/game.bvxinf"_qs << false;
     }
-
     void saveCreatesOneMissingFolder()
     {
         QFETCH(QString, relative);

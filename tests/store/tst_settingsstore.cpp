@@ -51,7 +51,6 @@ private Q_SLOTS:
         QTest::newRow("upper") << u"files"_qs << u"count"_qs << u"FILES"_qs << u"COUNT"_qs;
         QTest::newRow("non-ASCII") << u"Ёлка"_qs << u"Ключ"_qs << u"ёЛКА"_qs << u"КЛЮЧ"_qs;
     }
-
     void caseRules()
     {
         QFETCH(QString, writeSection);
@@ -87,7 +86,6 @@ private Q_SLOTS:
         QTest::newRow("bracket section") << u"a]b["_qs << u"k"_qs << u"v"_qs;
         QTest::newRow("non-ASCII") << u"FilesNames"_qs << u"FileName1"_qs << u"Игра «Линии»"_qs;
     }
-
     void roundTripThroughFile()
     {
         QFETCH(QString, section);
@@ -150,7 +148,6 @@ private Q_SLOTS:
         QTest::newRow("entry before any section") << QByteArray("Count=1\n[Files]\n") << u"none"_qs;
         QTest::newRow("invalid UTF-8 entry") << QByteArray("[Files]\nCount=\xe9\n") << u"none"_qs;
     }
-
     void handEditedFile()
     {
         QFETCH(QByteArray, bytes);
@@ -211,7 +208,6 @@ private Q_SLOTS:
         QTest::newRow("folder") << true;
         QTest::newRow("named pipe") << false;
     }
-
     void settingsPathIsNotAFile()
     {
         QFETCH(bool, folder);

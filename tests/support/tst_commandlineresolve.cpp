@@ -60,7 +60,6 @@ private Q_SLOTS:
         QTest::newRow("quoted, blank inside") << u"\"{root}/my games/run game \""_qs << none << QStringList();
         QTest::newRow("empty quotes") << u"\"\" x"_qs << none << QStringList();
     }
-
     void resolve()
     {
         QFETCH(QString, commandLine);

@@ -57,7 +57,6 @@ private Q_SLOTS:
         QTest::newRow("slash, query cut") << AddSlash(u"C:\\a?b\\"_qs) << u"C:\\a\\"_qs;
         QTest::newRow("slash, only a query") << AddSlash(u"?x"_qs) << QString();
     }
-
     void paths()
     {
         QFETCH(QString, actual);

@@ -32,7 +32,6 @@ private Q_SLOTS:
             << 38 << "BRIMVAULT_PROGRAM_FILES"_qba << QByteArray() << u"\\x"_qs << u"program"_qs;
         QTest::newRow("unknown code") << 999 << QByteArray() << QByteArray() << u"\\x"_qs << u"program"_qs;
     }
-
     void specialFolders()
     {
         QFETCH(int, csidl);
