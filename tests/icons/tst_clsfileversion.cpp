@@ -1,4 +1,5 @@
 #include "PeFixtures.h"
+#include "ProgramRun.h"
 #include "TestEnvironment.h"
 #include "TestFiles.h"
 #include "TestSuite.h"
@@ -187,7 +188,7 @@ private Q_SLOTS:
         environment.insert(u"XDG_RUNTIME_DIR"_s, m_env.root()); // else Qt's start-up note shares standard error
         process.setProcessEnvironment(environment);
         const auto run = [&process](const QStringList& arguments) {
-            process.start(QStringLiteral(BRIMVAULT_BIN_DIR "/brimvault"), arguments);
+            process.start(ProgramPath(), arguments);
             return process.waitForFinished(60000) ? process.exitCode() : -1;
         };
         QCOMPARE(run({u"--version-info"_s, PeFixture(u"ver_ru32.exe"_s)}), 0);
