@@ -28,16 +28,10 @@ void LocalHttpServer::answer(QTcpSocket* socket)
     if (requestLine.size() >= 2)
         targets.append(QString::fromLatin1(requestLine.at(1)));
 
-    // A 304 carries no body by definition.
-    const bool withBody = status != 304;
     QByteArray response = "HTTP/1.1 " + QByteArray::number(status) + " Status\r\n";
     if (status == 301 || status == 302)
         response += "Location: " + root().toLatin1() + "/elsewhere\r\n";
-    if (withBody)
-        response += "Content-Length: " + QByteArray::number(body.size()) + "\r\n";
-    response += "Connection: close\r\n\r\n";
-    if (withBody)
-        response += body;
+    response += "Content-Length: " + QByteArray::number(body.size()) + "\r\nConnection: close\r\n\r\n" + body;
     socket->write(response);
     socket->disconnectFromHost();
     connect(socket, &QTcpSocket::disconnected, socket, &QObject::deleteLater);

@@ -24,7 +24,6 @@ private Q_SLOTS:
         QTest::addColumn<bool>("identity");
         QTest::newRow("96 dpi") << 15.0 << 15.0 << 1.0 << 1.0 << true;
         QTest::newRow("120 dpi") << 12.0 << 12.0 << 0.8 << 0.8 << false;
-        QTest::newRow("144 dpi") << 10.0 << 10.0 << 2.0 / 3.0 << 2.0 / 3.0 << false;
         QTest::newRow("72 dpi") << 20.0 << 20.0 << 4.0 / 3.0 << 4.0 / 3.0 << false;
         QTest::newRow("only vertical differs") << 15.0 << 12.0 << 1.0 << 0.8 << false;
     }
