@@ -107,7 +107,7 @@ qulonglong DesktopDriver::waitForWindow(
     const QString& namePattern, int timeoutMs, const QList<qulonglong>& except) const
 {
     qulonglong found = 0;
-    QTest::qWaitFor(
+    const bool shown = QTest::qWaitFor(
         [&] {
             for (qulonglong window : windows(namePattern)) {
                 if (!except.contains(window) && !windowGeometry(window).isEmpty()) {
@@ -118,7 +118,7 @@ qulonglong DesktopDriver::waitForWindow(
             return found != 0;
         },
         timeoutMs);
-    return found;
+    return shown ? found : 0;
 }
 
 bool DesktopDriver::waitForWindowGone(qulonglong window, int timeoutMs) const

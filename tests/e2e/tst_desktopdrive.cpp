@@ -108,7 +108,7 @@ class TestDesktopDrive : public QObject {
     void keepScreenshot(const QString& step)
     {
         m_desktop->screenshot(
-            QStringLiteral(BRIMVAULT_SCREENSHOT_DIR "/%1-%2.png").arg(++m_shots, 2, 10, u'0').arg(step));
+            QStringLiteral(BRIMVAULT_SCREENSHOT_DIR "/%1-%2.png").arg(++m_shots, 2, 10, QLatin1Char('0')).arg(step));
     }
 
     QImage screen() const { return m_desktop->screenshot(m_env->path(QStringLiteral("poll.png"))); }
