@@ -40,14 +40,6 @@ private Q_SLOTS:
         QCOMPARE(factors.isIdentity(), identity);
     }
 
-    void screenTwipsFollowTheLogicalDpi()
-    {
-        QWidget widget;
-        const FormScaling::TwipsPerPixel screen = FormScaling::ScreenTwipsPerPixel(&widget);
-        QCOMPARE(screen.x, 1440.0 / widget.logicalDpiX());
-        QCOMPARE(screen.y, 1440.0 / widget.logicalDpiY());
-    }
-
     // A control keeps its designed size in pixels: loaded at 12 twips per pixel it comes out 1.25 times
     // larger, and the factor 0.8 takes it back.
     void scalingKeepsTheDesignedPixels()
