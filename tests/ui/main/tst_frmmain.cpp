@@ -250,7 +250,6 @@ private Q_SLOTS:
         mime.setUrls({QUrl::fromLocalFile(first), QUrl::fromLocalFile(movie), QUrl::fromLocalFile(second)});
         QDragEnterEvent enter(QPoint(40, 40), Qt::CopyAction, &mime, Qt::LeftButton, Qt::NoModifier);
         QApplication::sendEvent(list, &enter);
-        QVERIFY(enter.isAccepted());
         QDropEvent drop(QPointF(40, 40), Qt::CopyAction, &mime, Qt::LeftButton, Qt::NoModifier);
         QApplication::sendEvent(list, &drop);
         QVERIFY(drop.isAccepted());
