@@ -1,7 +1,7 @@
 // From asking the media host to play a Flash movie to Ruffle reporting the movie's metadata, against the
 // floor of that path: the same host window loading a plain local page.
 #include "BenchReport.h"
-#include "SwfBuilder.h"
+#include "MovieFiles.h"
 
 #include "media/WebEngineStartup.h"
 #include "media/frmReclama.h"

@@ -2,169 +2,92 @@
 #include "catalogue/GameNames.h"
 #include "catalogue/IconCacheKey.h"
 
-#include "TestEnvironment.h"
-
-#include <QtTest>
+#include "TestSuite.h"
 
 using namespace Brimvault;
+using namespace Qt::StringLiterals;
 
 class TestGameRules : public QObject {
     Q_OBJECT
 private Q_SLOTS:
-    void initTestCase();
-    void tidyName_data();
-    void tidyName();
-    void builtInName_data();
-    void builtInName();
-    void iconCacheKey_data();
-    void iconCacheKey();
-    void sameNameInOtherFolders();
-    void discoverable_data();
-    void discoverable();
-    void folderScanExtension_data();
-    void folderScanExtension();
+    // Names: the tidied caption, the built-in zone table, the icon cache key ("" when not applicable).
+    void names_data()
+    {
+        QTest::addColumn<char>("rule"); // t: tidied name, b: built-in name, k: cache key
+        QTest::addColumn<QString>("input");
+        QTest::addColumn<QString>("expected");
+        const QString prefix = u"Исполняемый файл для игры"_s;
+        QTest::newRow("russian prefix cut") << 't' << prefix + u" Chess"_s << u"Chess"_s;
+        QTest::newRow("prefix elsewhere kept") << 't' << u"A "_s + prefix << u"A "_s + prefix;
+        QTest::newRow("prefix without blank kept") << 't' << prefix << prefix;
+        QTest::newRow("12 unbroken") << 't' << u"ABCDEFGHIJKL"_s << u"ABCDEFGHIJKL"_s;
+        QTest::newRow("13 broken after 12") << 't' << u"ABCDEFGHIJKLM"_s << u"ABCDEFGHIJKL M"_s;
+        QTest::newRow("24 one break") << 't' << u"ABCDEFGHIJKLMNOPQRSTUVWX"_s << u"ABCDEFGHIJKL MNOPQRSTUVWX"_s;
+        QTest::newRow("25 second break") << 't' << u"ABCDEFGHIJKLMNOPQRSTUVWXY"_s << u"ABCDEFGHIJKL MNOPQRSTUVWX Y"_s;
+        QTest::newRow("blanks unbroken") << 't' << u"Solitaire Collection Deluxe"_s << u"Solitaire Collection Deluxe"_s;
+        QTest::newRow("30 kept") << 't' << u"Thirty characters long name ok"_s << u"Thirty characters long name ok"_s;
+        QTest::newRow("31 cut") << 't' << u"Thirty-one characters long name"_s
+                                << u"Thirty-one characters long nam..."_s;
+        QTest::newRow("prefix, break, cut")
+            << 't' << prefix + u' ' + QString(40, u'x') << u"xxxxxxxxxxxx xxxxxxxxxxxx xxxxxx..."_s;
+        QTest::newRow("zone hearts") << 'b' << u"hrtzzm"_s << u"Internet Chervi"_s;
+        QTest::newRow("zone any case") << 'b' << u"RVSEZM"_s << u"Internet Reversi"_s;
+        QTest::newRow("zone backgammon") << 'b' << u"bckgzm"_s << u"Internet Nardi"_s;
+        QTest::newRow("member without row") << 'b' << u"zm"_s << QString();
+        QTest::newRow("publisher game, built-in language") << 'b' << u"sudoku"_s << QString();
+        QTest::newRow("worked example") << 'k' << u"C:\\G.exe"_s << u"G325331"_s;
+        // Odd positions C \ . x = 67+92+46+120, even : G e e with "g" 103 instead of 71.
+        QTest::newRow("sums use the path as given") << 'k' << u"C:\\g.exe"_s << u"G325363"_s;
+        QTest::newRow("unix path") << 'k' << u"/a/b.exe"_s << u"B260397"_s;
+        QTest::newRow("no extension") << 'k' << u"ab"_s << u"AB9798"_s;
+        QTest::newRow("eight-bit code") << 'k' << u"é"_s << u"É2330"_s;
+        QTest::newRow("outside the code page") << 'k' << u"ж"_s << u"Ж630"_s;
+        QTest::newRow("empty") << 'k' << QString() << u"00"_s;
+    }
+    void names()
+    {
+        QFETCH(char, rule);
+        QFETCH(QString, input);
+        QFETCH(QString, expected);
+        if (rule == 't')
+            QCOMPARE(GameNames::TidyName(input), expected);
+        if (rule == 'b')
+            QCOMPARE(GameNames::BuiltInName(input), expected);
+        if (rule != 'k')
+            return;
+        QCOMPARE(IconCacheKey(input), expected);
+        QCOMPARE(IconCacheFile(u"/c/Icons/"_s, input), u"/c/Icons/"_s + expected + u".ico"_s);
+        QVERIFY(IconCacheFile(QString(), input).isEmpty());
+    }
 
-private:
-    TestEnvironment m_env;
+    void gameFileNames_data()
+    {
+        QTest::addColumn<QString>("name");
+        QTest::addColumn<bool>("discoverable");
+        QTest::addColumn<bool>("scanned"); // the extensions a folder scan takes
+        QTest::newRow("game") << u"game.exe"_s << true << true;
+        QTest::newRow("upper-case extension") << u"GAME.EXE"_s << true << true;
+        QTest::newRow("flash movie") << u"a.SWF"_s << false << true;
+        QTest::newRow("not an executable") << u"readme.txt"_s << false << false;
+        QTest::newRow("extension inside name") << u"game.exe.txt"_s << false << false;
+        QTest::newRow("no extension") << u"exe"_s << false << false;
+        QTest::newRow("partial extension") << u"a.ex"_s << false << false;
+        QTest::newRow("dot in folder only") << u"dir.exe\\file"_s << false << false;
+        QTest::newRow("service") << u"BrimvaultService.exe"_s << false << true;
+        QTest::newRow("program itself any case") << u"brimvault.EXE"_s << false << true;
+        QTest::newRow("piece of uninst.exe") << u"t.exe"_s << false << true;
+        QTest::newRow("ends in 000.exe") << u"000.exe"_s << false << true;
+        QTest::newRow("UNWISE any case") << u"unwise.exe"_s << false << true;
+        QTest::newRow("setup any case") << u"GameSETUP.exe"_s << false << true;
+        QTest::newRow("installer") << u"Install.exe"_s << false << true;
+        QTest::newRow("similar but longer") << u"xuninst.exe"_s << true << true;
+    }
+    void gameFileNames()
+    {
+        QFETCH(QString, name);
+        QTEST(GameFileRules::IsDiscoverableExecutable(name), "discoverable");
+        QTEST(GameFileRules::HasAcceptedExtension(name), "scanned");
+    }
 };
-
-void TestGameRules::initTestCase()
-{
-    QVERIFY(QDir(m_env.root()).exists());
-}
-
-void TestGameRules::tidyName_data()
-{
-    QTest::addColumn<QString>("name");
-    QTest::addColumn<QString>("expected");
-    QTest::newRow("russian prefix cut") << QStringLiteral("Исполняемый файл для игры Chess") << QStringLiteral("Chess");
-    QTest::newRow("prefix elsewhere kept")
-        << QStringLiteral("A Исполняемый файл для игры") << QStringLiteral("A Исполняемый файл для игры");
-    QTest::newRow("prefix without blank kept")
-        << QStringLiteral("Исполняемый файл для игры") << QStringLiteral("Исполняемый файл для игры");
-    QTest::newRow("40 without blanks") << QStringLiteral("ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmn")
-                                       << QStringLiteral("ABCDEFGHIJKL MNOPQRSTUVWX YZabcd...");
-    QTest::newRow("exactly 12 unbroken") << QStringLiteral("ABCDEFGHIJKL") << QStringLiteral("ABCDEFGHIJKL");
-    QTest::newRow("13 broken after 12") << QStringLiteral("ABCDEFGHIJKLM") << QStringLiteral("ABCDEFGHIJKL M");
-    QTest::newRow("24 letters, 25 after break, stays")
-        << QStringLiteral("ABCDEFGHIJKLMNOPQRSTUVWX") << QStringLiteral("ABCDEFGHIJKL MNOPQRSTUVWX");
-    QTest::newRow("25 letters get a second blank after the 25th character")
-        << QStringLiteral("ABCDEFGHIJKLMNOPQRSTUVWXY") << QStringLiteral("ABCDEFGHIJKL MNOPQRSTUVWX Y");
-    QTest::newRow("26 letters get a second blank after the 25th character")
-        << QStringLiteral("ABCDEFGHIJKLMNOPQRSTUVWXYZ") << QStringLiteral("ABCDEFGHIJKL MNOPQRSTUVWX YZ");
-    QTest::newRow("27 with blanks unbroken")
-        << QStringLiteral("Solitaire Collection Deluxe") << QStringLiteral("Solitaire Collection Deluxe");
-    QTest::newRow("exactly 30 kept") << QStringLiteral("Thirty characters long name ok")
-                                     << QStringLiteral("Thirty characters long name ok");
-    QTest::newRow("31 cut") << QStringLiteral("Thirty-one characters long name")
-                            << QStringLiteral("Thirty-one characters long nam...");
-    QTest::newRow("prefix then cut") << QStringLiteral("Исполняемый файл для игры ") + QString(31, u'x')
-                                     << QStringLiteral("xxxxxxxxxxxx xxxxxxxxxxxx xxxxxx...");
-    QTest::newRow("empty") << QString() << QString();
-}
-
-void TestGameRules::tidyName()
-{
-    QFETCH(QString, name);
-    QFETCH(QString, expected);
-    QCOMPARE(GameNames::TidyName(name), expected);
-}
-
-void TestGameRules::builtInName_data()
-{
-    QTest::addColumn<QString>("title");
-    QTest::addColumn<QString>("expected");
-    QTest::newRow("zone hearts") << QStringLiteral("hrtzzm") << QStringLiteral("Internet Chervi");
-    QTest::newRow("zone any case") << QStringLiteral("RVSEZM") << QStringLiteral("Internet Reversi");
-    QTest::newRow("zone backgammon") << QStringLiteral("bckgzm") << QStringLiteral("Internet Nardi");
-    QTest::newRow("member without row") << QStringLiteral("zm") << QString();
-    QTest::newRow("publisher game, built-in language") << QStringLiteral("sudoku") << QString();
-    QTest::newRow("other title") << QStringLiteral("doom") << QString();
-}
-
-void TestGameRules::builtInName()
-{
-    QFETCH(QString, title);
-    QFETCH(QString, expected);
-    QCOMPARE(GameNames::BuiltInName(title), expected);
-}
-
-void TestGameRules::iconCacheKey_data()
-{
-    QTest::addColumn<QString>("path");
-    QTest::addColumn<QString>("expected");
-    QTest::newRow("worked example") << QStringLiteral("C:\\G.exe") << QStringLiteral("G325331");
-    // Odd positions C \ . x = 67+92+46+120, even : G e e with "g" 103 instead of 71.
-    QTest::newRow("sums use the path as given") << QStringLiteral("C:\\g.exe") << QStringLiteral("G325363");
-    QTest::newRow("unix path") << QStringLiteral("/a/b.exe") << QStringLiteral("B260397");
-    QTest::newRow("no extension") << QStringLiteral("ab") << QStringLiteral("AB9798");
-    QTest::newRow("eight-bit code") << QStringLiteral("é") << QStringLiteral("É2330");
-    QTest::newRow("outside the code page") << QStringLiteral("ж") << QStringLiteral("Ж630");
-    QTest::newRow("empty") << QString() << QStringLiteral("00");
-}
-
-void TestGameRules::iconCacheKey()
-{
-    QFETCH(QString, path);
-    QFETCH(QString, expected);
-    QCOMPARE(IconCacheKey(path), expected);
-    QCOMPARE(IconCacheFile(QStringLiteral("/c/Icons/"), path), QStringLiteral("/c/Icons/") + expected + u".ico");
-}
-
-void TestGameRules::sameNameInOtherFolders()
-{
-    const QString first = IconCacheKey(QStringLiteral("C:\\Games\\One\\game.exe"));
-    const QString second = IconCacheKey(QStringLiteral("C:\\Games\\Two\\game.exe"));
-    QVERIFY(first.startsWith(QStringLiteral("GAME")));
-    QVERIFY(second.startsWith(QStringLiteral("GAME")));
-    QVERIFY(first != second);
-    QVERIFY(IconCacheFile(QString(), QStringLiteral("C:\\G.exe")).isEmpty());
-}
-
-void TestGameRules::discoverable_data()
-{
-    QTest::addColumn<QString>("name");
-    QTest::addColumn<bool>("discoverable");
-    QTest::newRow("game") << QStringLiteral("game.exe") << true;
-    QTest::newRow("upper-case extension") << QStringLiteral("GAME.EXE") << true;
-    QTest::newRow("not an executable") << QStringLiteral("game.txt") << false;
-    QTest::newRow("extension inside name") << QStringLiteral("game.exe.txt") << false;
-    QTest::newRow("service") << QStringLiteral("BrimvaultService.exe") << false;
-    QTest::newRow("program itself any case") << QStringLiteral("brimvault.EXE") << false;
-    QTest::newRow("piece of uninst.exe") << QStringLiteral("t.exe") << false;
-    QTest::newRow("ends in 000.exe") << QStringLiteral("000.exe") << false;
-    QTest::newRow("UNWISE any case") << QStringLiteral("unwise.exe") << false;
-    QTest::newRow("setup any case") << QStringLiteral("GameSETUP.exe") << false;
-    QTest::newRow("installer") << QStringLiteral("Install.exe") << false;
-    QTest::newRow("uninstaller of another kind") << QStringLiteral("uninstall.exe") << false;
-    QTest::newRow("similar but longer") << QStringLiteral("xuninst.exe") << true;
-}
-
-void TestGameRules::discoverable()
-{
-    QFETCH(QString, name);
-    QFETCH(bool, discoverable);
-    QCOMPARE(GameFileRules::IsDiscoverableExecutable(name), discoverable);
-}
-
-void TestGameRules::folderScanExtension_data()
-{
-    QTest::addColumn<QString>("name");
-    QTest::addColumn<bool>("accepted");
-    QTest::newRow("exe") << QStringLiteral("a.exe") << true;
-    QTest::newRow("swf upper") << QStringLiteral("a.SWF") << true;
-    QTest::newRow("text") << QStringLiteral("readme.txt") << false;
-    QTest::newRow("no extension") << QStringLiteral("exe") << false;
-    QTest::newRow("partial extension") << QStringLiteral("a.ex") << false;
-    QTest::newRow("dot in folder only") << QStringLiteral("dir.exe\\file") << false;
-}
-
-void TestGameRules::folderScanExtension()
-{
-    QFETCH(QString, name);
-    QFETCH(bool, accepted);
-    QCOMPARE(GameFileRules::HasAcceptedExtension(name), accepted);
-}
-
-QTEST_GUILESS_MAIN(TestGameRules)
+BV_REGISTER_TEST(TestGameRules);
 #include "tst_gamerules.moc"

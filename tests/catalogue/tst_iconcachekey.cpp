@@ -1,5 +1,7 @@
 #include "catalogue/IconCacheKey.h"
 
+#include "TestSuite.h"
+
 #include <QtTest>
 
 using namespace Brimvault;
@@ -38,5 +40,5 @@ void TestIconCacheKey::keyInTheLocalesCodePage()
     QCOMPARE(IconCacheKey(path), key);
 }
 
-QTEST_GUILESS_MAIN(TestIconCacheKey)
+BV_REGISTER_TEST(TestIconCacheKey);
 #include "tst_iconcachekey.moc"

@@ -4,14 +4,15 @@
 #include "catalogue/ListBuilder.h"
 #include "i18n/modLocalizer.h"
 
-#include "CatalogueTestTree.h"
+#include "CatalogueFiles.h"
+#include "CatalogueIcon.h"
 #include "TestEnvironment.h"
 #include "TestFiles.h"
+#include "TestSuite.h"
 
 #include <QtTest>
 
 using namespace Brimvault;
-using namespace CatalogueTestTree;
 
 // Games unpacked from archives made on Windows spell the system's own files any way; they are found alike.
 class TestSideFiles : public QObject {
@@ -63,21 +64,21 @@ void TestSideFiles::stopMarkInAnyCase_data()
 void TestSideFiles::stopMarkInAnyCase()
 {
     QFETCH(QString, mark);
-    QVERIFY(writeFile(games(QStringLiteral("Tools/tools.exe"))));
-    QVERIFY(writeFile(games(QStringLiteral("Tools/below/hidden.exe"))));
+    QVERIFY(WriteFile(games(QStringLiteral("Tools/tools.exe"))));
+    QVERIFY(WriteFile(games(QStringLiteral("Tools/below/hidden.exe"))));
     QVERIFY(
-        writeInfoFile(games(QStringLiteral("Tools/") + mark), {{QStringLiteral("StopDir"), QStringLiteral("Yes")}}));
+        WriteInfoFile(games(QStringLiteral("Tools/") + mark), {{QStringLiteral("StopDir"), QStringLiteral("Yes")}}));
     QCOMPARE(pathsOf(discover()).mid(1), QStringList {games(QStringLiteral("Tools/tools.exe"))});
 }
 
 void TestSideFiles::infoFileAndIconInAnyCase()
 {
-    const QByteArray icon = iconFileBytes();
+    const QByteArray icon = ValidIconFile();
     REQUIRE_FIXTURE(!icon.isEmpty(), "the icon fixture multi64.exe");
-    QVERIFY(writeFile(games(QStringLiteral("Chess/game.exe"))));
+    QVERIFY(WriteFile(games(QStringLiteral("Chess/game.exe"))));
     QVERIFY(
-        writeInfoFile(games(QStringLiteral("Chess/GAME.BVXINF")), {{QStringLiteral("Name"), QStringLiteral("Chess")}}));
-    QVERIFY(writeFile(games(QStringLiteral("Chess/Game.ICO")), icon));
+        WriteInfoFile(games(QStringLiteral("Chess/GAME.BVXINF")), {{QStringLiteral("Name"), QStringLiteral("Chess")}}));
+    QVERIFY(WriteFile(games(QStringLiteral("Chess/Game.ICO")), icon));
 
     const QList<GameEntry> entries = discover();
     QCOMPARE(entries.size(), 2);
@@ -86,5 +87,5 @@ void TestSideFiles::infoFileAndIconInAnyCase()
     QCOMPARE(entries.at(1).iconFile, games(QStringLiteral("Chess/Game.ICO")));
 }
 
-QTEST_MAIN(TestSideFiles)
+BV_REGISTER_TEST(TestSideFiles);
 #include "tst_sidefiles.moc"

@@ -23,10 +23,38 @@ public:
         qputenv("BRIMVAULT_CATALOGUE_ROOT", "http://127.0.0.1:9");
     }
 
+    ~TestEnvironment()
+    {
+        if (m_programDir)
+            qunsetenv("BRIMVAULT_PROGRAM_DIR");
+        if (m_locale)
+            qunsetenv("BRIMVAULT_LOCALE");
+    }
+    TestEnvironment(const TestEnvironment&) = delete;
+    TestEnvironment& operator=(const TestEnvironment&) = delete;
+
+    // A program folder of the test's own (BRIMVAULT_PROGRAM_DIR) inside the tree, made on first use.
+    QString programDir()
+    {
+        const QString dir = path(QStringLiteral("program"));
+        QDir().mkpath(dir);
+        qputenv("BRIMVAULT_PROGRAM_DIR", dir.toLocal8Bit());
+        m_programDir = true;
+        return dir;
+    }
+    // The user's locale as the program sees it (BRIMVAULT_LOCALE, e.g. "ru_RU").
+    void setLocale(const QByteArray& name)
+    {
+        qputenv("BRIMVAULT_LOCALE", name);
+        m_locale = true;
+    }
+
     QString root() const { return m_root.path(); }
     QString path(const QString& relative) const { return m_root.path() + u'/' + relative; }
     QString settingsFile() const { return path(QStringLiteral("settings/Brimvault.ini")); }
 
 private:
     QTemporaryDir m_root;
+    bool m_programDir = false;
+    bool m_locale = false;
 };

@@ -16,6 +16,12 @@ bool WriteFile(const QString& path, const QByteArray& bytes)
     return file.open(QIODevice::WriteOnly | QIODevice::Truncate) && file.write(bytes) == bytes.size();
 }
 
+bool WriteExecutable(const QString& path, const QByteArray& bytes)
+{
+    return WriteFile(path, bytes)
+        && QFile::setPermissions(path, QFile::permissions(path) | QFileDevice::ExeOwner | QFileDevice::ExeUser);
+}
+
 QByteArray ReadFile(const QString& path)
 {
     QFile file(path);
@@ -41,8 +47,8 @@ QMap<QString, QByteArray> SnapshotTree(const QString& root)
 {
     QMap<QString, QByteArray> tree;
     const QDir base(root);
-    QDirIterator it(root, QDir::AllEntries | QDir::NoDotAndDotDot | QDir::Hidden | QDir::System,
-        QDirIterator::Subdirectories);
+    QDirIterator it(
+        root, QDir::AllEntries | QDir::NoDotAndDotDot | QDir::Hidden | QDir::System, QDirIterator::Subdirectories);
     while (it.hasNext()) {
         const QFileInfo info(it.next());
         const QString relative = base.relativeFilePath(info.filePath());

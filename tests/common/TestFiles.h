@@ -9,6 +9,8 @@
 
 bool WriteFile(const QString& path, const QByteArray& bytes = QByteArrayLiteral("MZ"));
 QByteArray ReadFile(const QString& path);
+// A file its owner may run (a shell script by default).
+bool WriteExecutable(const QString& path, const QByteArray& bytes = QByteArrayLiteral("#!/bin/sh\nexit 0\n"));
 bool MakeNamedPipe(const QString& path);
 QByteArray RandomBytes(qsizetype size, quint32 seed);
 
@@ -19,14 +21,14 @@ QMap<QString, QByteArray> SnapshotTree(const QString& root);
 // A tool or fixture the test needs: fails the test with what to install when it is missing, never skips.
 // Use as: REQUIRE_TOOL("wrestool", "icoutils");
 bool HaveTool(const QString& program);
-#define REQUIRE_TOOL(program, debianPackage)                                                                \
-    do {                                                                                                   \
-        if (!HaveTool(QStringLiteral(program)))                                                            \
-            QFAIL(qPrintable(QStringLiteral("%1 is missing: install the Debian package %2 (make test does)") \
-                                 .arg(QStringLiteral(program), QStringLiteral(debianPackage))));           \
+#define REQUIRE_TOOL(program, debianPackage)                                                                           \
+    do {                                                                                                               \
+        if (!HaveTool(QStringLiteral(program)))                                                                        \
+            QFAIL(qPrintable(QStringLiteral("%1 is missing: install the Debian package %2 (make test does)")           \
+                                 .arg(QStringLiteral(program), QStringLiteral(debianPackage))));                       \
     } while (false)
-#define REQUIRE_FIXTURE(condition, what)                                                                   \
-    do {                                                                                                   \
-        if (!(condition))                                                                                  \
-            QFAIL(qPrintable(QStringLiteral("missing %1: build it with make test").arg(QStringLiteral(what)))); \
+#define REQUIRE_FIXTURE(condition, what)                                                                               \
+    do {                                                                                                               \
+        if (!(condition))                                                                                              \
+            QFAIL(qPrintable(QStringLiteral("missing %1: build it with make test").arg(QStringLiteral(what))));        \
     } while (false)

@@ -4,21 +4,52 @@
 #include <QDir>
 #include <QFileInfo>
 #include <QHash>
-#include <QProcess>
+#include <QRegularExpression>
 #include <QTest>
 
 namespace {
 
 // xdotool waits this long between keys and typed characters, so that every event is handled in turn.
-constexpr char KeyDelayMs[] = "60";
+const QString KeyDelayMs = QStringLiteral("60");
 constexpr int PollMs = 100;
 
 } // namespace
 
-DesktopDriver::DesktopDriver(const QString& display, const QString& helperProgram)
-    : m_display(display)
-    , m_helper(helperProgram)
+DesktopDriver::DesktopDriver(const QString& helperProgram)
+    : m_helper(helperProgram)
 { }
+
+DesktopDriver::~DesktopDriver()
+{
+    m_xvfb.terminate();
+    if (!m_xvfb.waitForFinished(5000)) {
+        m_xvfb.kill();
+        m_xvfb.waitForFinished(5000);
+    }
+}
+
+QString DesktopDriver::start(int width, int height)
+{
+    // With -displayfd the server writes its display number to that descriptor once it is ready for clients.
+    m_xvfb.start(QStringLiteral("Xvfb"),
+        {QStringLiteral("-displayfd"), QStringLiteral("1"), QStringLiteral("-screen"), QStringLiteral("0"),
+            QStringLiteral("%1x%2x24").arg(width).arg(height), QStringLiteral("-nolisten"), QStringLiteral("tcp"),
+            QStringLiteral("-noreset")});
+    if (!m_xvfb.waitForStarted(30000))
+        return QStringLiteral("Xvfb did not start: ") + m_xvfb.errorString();
+    static const QRegularExpression number(QStringLiteral("^(\\d+)\\n$"));
+    QByteArray output;
+    const QDeadlineTimer deadline(30000);
+    while (!deadline.hasExpired() && m_xvfb.state() == QProcess::Running) {
+        m_xvfb.waitForReadyRead(PollMs);
+        output += m_xvfb.readAllStandardOutput();
+        if (const QRegularExpressionMatch match = number.match(QString::fromLatin1(output)); match.hasMatch()) {
+            m_display = u':' + match.captured(1);
+            return {};
+        }
+    }
+    return QStringLiteral("Xvfb gave no display number: ") + QString::fromLocal8Bit(m_xvfb.readAllStandardError());
+}
 
 QProcessEnvironment DesktopDriver::environment() const
 {
@@ -29,34 +60,41 @@ QProcessEnvironment DesktopDriver::environment() const
     return environment;
 }
 
-DesktopDriver::Result DesktopDriver::run(const QString& program, const QStringList& arguments, int timeoutMs) const
+bool DesktopDriver::run(const QString& program, const QStringList& arguments, QString* output) const
 {
     QProcess process;
     process.setProcessEnvironment(environment());
     process.start(program, arguments);
-    Result result;
-    result.finished = process.waitForFinished(timeoutMs) && process.exitStatus() == QProcess::NormalExit;
-    if (process.state() != QProcess::NotRunning) {
+    const bool ended = process.waitForFinished(20000) && process.exitStatus() == QProcess::NormalExit;
+    if (!ended) {
         process.kill();
         process.waitForFinished(5000);
     }
-    result.exitCode = process.exitCode();
-    result.output = QString::fromUtf8(process.readAllStandardOutput());
-    result.errors = QString::fromLocal8Bit(process.readAllStandardError());
-    return result;
+    if (output)
+        *output = QString::fromUtf8(process.readAllStandardOutput());
+    return ended && process.exitCode() == 0;
 }
 
-DesktopDriver::Result DesktopDriver::xdotool(const QStringList& arguments) const
+bool DesktopDriver::xdotool(const QStringList& arguments, QString* output) const
 {
-    return run(QStringLiteral("xdotool"), arguments);
+    return run(QStringLiteral("xdotool"), arguments, output);
 }
 
-namespace {
-
-QList<qulonglong> windowIds(const QString& output)
+QString DesktopDriver::ask(const QStringList& arguments) const
 {
+    QString output;
+    xdotool(arguments, &output);
+    return output.trimmed();
+}
+
+QList<qulonglong> DesktopDriver::windows(const QString& namePattern) const
+{
+    // No match is exit code 1 with empty output: an empty list, not a failure.
+    const QStringList search = namePattern.isEmpty() ? QStringList {QStringLiteral("--class"), QStringLiteral(".*")}
+                                                     : QStringList {QStringLiteral("--name"), namePattern};
     QList<qulonglong> windows;
-    for (const QString& line : output.split(u'\n', Qt::SkipEmptyParts)) {
+    for (const QString& line : ask(QStringList {QStringLiteral("search"), QStringLiteral("--onlyvisible")} + search)
+                                   .split(u'\n', Qt::SkipEmptyParts)) {
         bool ok = false;
         const qulonglong window = line.trimmed().toULongLong(&ok);
         if (ok)
@@ -65,77 +103,49 @@ QList<qulonglong> windowIds(const QString& output)
     return windows;
 }
 
-} // namespace
-
-QList<qulonglong> DesktopDriver::visibleWindows(const QString& namePattern) const
-{
-    // No match is exit code 1 with empty output: an empty list, not a failure.
-    return windowIds(
-        xdotool({QStringLiteral("search"), QStringLiteral("--onlyvisible"), QStringLiteral("--name"), namePattern})
-            .output);
-}
-
-QList<qulonglong> DesktopDriver::allVisibleWindows() const
-{
-    return windowIds(xdotool(
-        {QStringLiteral("search"), QStringLiteral("--onlyvisible"), QStringLiteral("--class"), QStringLiteral(".*")})
-                         .output);
-}
-
 qulonglong DesktopDriver::waitForWindow(
     const QString& namePattern, int timeoutMs, const QList<qulonglong>& except) const
 {
-    QDeadlineTimer deadline(timeoutMs);
-    do {
-        for (qulonglong window : visibleWindows(namePattern)) {
-            if (!except.contains(window) && !windowGeometry(window).isEmpty())
-                return window;
-        }
-        QTest::qWait(PollMs);
-    } while (!deadline.hasExpired());
-    return 0;
+    qulonglong found = 0;
+    const bool shown = QTest::qWaitFor(
+        [&] {
+            for (qulonglong window : windows(namePattern)) {
+                if (!except.contains(window) && !windowGeometry(window).isEmpty()) {
+                    found = window;
+                    break;
+                }
+            }
+            return found != 0;
+        },
+        timeoutMs);
+    return shown ? found : 0;
 }
 
 bool DesktopDriver::waitForWindowGone(qulonglong window, int timeoutMs) const
 {
-    QDeadlineTimer deadline(timeoutMs);
-    do {
-        if (!allVisibleWindows().contains(window))
-            return true;
-        QTest::qWait(PollMs);
-    } while (!deadline.hasExpired());
-    return false;
+    return QTest::qWaitFor([&] { return !windows().contains(window); }, timeoutMs);
 }
 
 bool DesktopDriver::waitForFocus(qulonglong window, int timeoutMs) const
 {
-    QDeadlineTimer deadline(timeoutMs);
-    do {
-        if (xdotool({QStringLiteral("getwindowfocus")}).output.trimmed().toULongLong() == window)
-            return true;
-        QTest::qWait(PollMs);
-    } while (!deadline.hasExpired());
-    return false;
+    return QTest::qWaitFor([&] { return ask({QStringLiteral("getwindowfocus")}).toULongLong() == window; }, timeoutMs);
 }
 
 QString DesktopDriver::windowName(qulonglong window) const
 {
-    return xdotool({QStringLiteral("getwindowname"), QString::number(window)}).output.trimmed();
+    return ask({QStringLiteral("getwindowname"), QString::number(window)});
 }
 
 qint64 DesktopDriver::windowProcess(qulonglong window) const
 {
-    return xdotool({QStringLiteral("getwindowpid"), QString::number(window)}).output.trimmed().toLongLong();
+    return ask({QStringLiteral("getwindowpid"), QString::number(window)}).toLongLong();
 }
 
 QRect DesktopDriver::windowGeometry(qulonglong window) const
 {
-    const Result shell
-        = xdotool({QStringLiteral("getwindowgeometry"), QStringLiteral("--shell"), QString::number(window)});
-    if (!shell.succeeded())
-        return {};
     QHash<QString, int> values;
-    for (const QString& line : shell.output.split(u'\n', Qt::SkipEmptyParts)) {
+    for (const QString& line :
+        ask({QStringLiteral("getwindowgeometry"), QStringLiteral("--shell"), QString::number(window)}).split(u'\n')) {
         const qsizetype equals = line.indexOf(u'=');
         if (equals > 0)
             values.insert(line.left(equals), line.mid(equals + 1).toInt());
@@ -147,58 +157,42 @@ QRect DesktopDriver::windowGeometry(qulonglong window) const
 bool DesktopDriver::click(const QPoint& screen, int button) const
 {
     return moveTo(screen)
-        && xdotool(
-            {QStringLiteral("click"), QStringLiteral("--delay"), QLatin1String(KeyDelayMs), QString::number(button)})
-               .succeeded();
+        && xdotool({QStringLiteral("click"), QStringLiteral("--delay"), KeyDelayMs, QString::number(button)});
 }
 
 bool DesktopDriver::doubleClick(const QPoint& screen) const
 {
     return moveTo(screen)
         && xdotool({QStringLiteral("click"), QStringLiteral("--repeat"), QStringLiteral("2"), QStringLiteral("--delay"),
-                       QLatin1String(KeyDelayMs), QStringLiteral("1")})
-               .succeeded();
+            KeyDelayMs, QStringLiteral("1")});
 }
 
 bool DesktopDriver::moveTo(const QPoint& screen) const
 {
-    if (!xdotool({QStringLiteral("mousemove"), QString::number(screen.x()), QString::number(screen.y())}).succeeded())
+    if (!xdotool({QStringLiteral("mousemove"), QString::number(screen.x()), QString::number(screen.y())}))
         return false;
     // The pointer's arrival is an event of its own; the next press must not overtake it.
     QTest::qWait(PollMs);
     return true;
 }
 
-bool DesktopDriver::pressButton(int button) const
-{
-    return xdotool({QStringLiteral("mousedown"), QString::number(button)}).succeeded();
-}
-
-bool DesktopDriver::releaseButton(int button) const
-{
-    return xdotool({QStringLiteral("mouseup"), QString::number(button)}).succeeded();
-}
-
 bool DesktopDriver::keys(const QStringList& keyNames) const
 {
-    return xdotool(QStringList {QStringLiteral("key"), QStringLiteral("--delay"), QLatin1String(KeyDelayMs)} + keyNames)
-        .succeeded();
+    return xdotool(QStringList {QStringLiteral("key"), QStringLiteral("--delay"), KeyDelayMs} + keyNames);
 }
 
 bool DesktopDriver::typeText(const QString& text) const
 {
-    return xdotool({QStringLiteral("type"), QStringLiteral("--delay"), QLatin1String(KeyDelayMs), text}).succeeded();
+    return xdotool({QStringLiteral("type"), QStringLiteral("--delay"), KeyDelayMs, text});
 }
 
 bool DesktopDriver::closeWindow(qulonglong window) const
 {
-    return run(m_helper, {QStringLiteral("close"), QString::number(window)}).succeeded();
+    return run(m_helper, {QStringLiteral("close"), QString::number(window)});
 }
 
 QImage DesktopDriver::screenshot(const QString& pngPath) const
 {
     QDir().mkpath(QFileInfo(pngPath).absolutePath());
-    if (!run(m_helper, {QStringLiteral("grab"), pngPath}).succeeded())
-        return {};
-    return QImage(pngPath);
+    return run(m_helper, {QStringLiteral("grab"), pngPath}) ? QImage(pngPath) : QImage();
 }

@@ -1,415 +1,247 @@
 #include "gameactions/GameLauncher.h"
 
-#include "LaunchRecords.h"
-#include "TestEnvironment.h"
 #include "store/CatalogueKeys.h"
 #include "store/SettingsStore.h"
 
-#include <QDesktopServices>
+#include "LaunchRecords.h"
+#include "LocalHttpServer.h"
+#include "TestEnvironment.h"
+#include "TestFiles.h"
+#include "TestSuite.h"
+#include "UrlCatcher.h"
+
 #include <QSignalSpy>
-#include <QTcpServer>
-#include <QTcpSocket>
-#include <QTest>
-#include <QUrl>
 
 using namespace Brimvault;
+using namespace Qt::StringLiterals;
 
-class tst_GameLauncher : public QObject {
+// Games are copies of the launch recorder; the service beside the program is one too.
+class TestGameLauncher : public QObject {
     Q_OBJECT
-
-public Q_SLOTS:
-    void recordOpenedUrl(const QUrl& url) { m_openedUrls.append(url); }
-
-private Q_SLOTS:
-    void initTestCase();
-    void cleanupTestCase();
-    void init();
-    void cleanup();
-
-    void nativeGameStartsInItsOwnFolder_data();
-    void nativeGameStartsInItsOwnFolder();
-    void openGameOfflineFindsUpperCasedPath();
-    void browserOrProcess_data();
-    void browserOrProcess();
-    void flashMovieGoesToMediaHost();
-    void numberedMovie_data();
-    void numberedMovie();
-    void articleNeedsCatalogueServerToAnswer200_data();
-    void articleNeedsCatalogueServerToAnswer200();
-    void serviceSignalledOncePerRun();
-    void failedLaunchStillSignalsService();
-    void windowsGameThroughRunner_data();
-    void windowsGameThroughRunner();
-    void withoutRunnerWindowsGameFailsSilently();
-
-private:
-    QString root(const QString& relative) const { return m_env->path(relative); }
-    QString records() const { return root(QStringLiteral("records")); }
-    QString installGame(const QString& relative);
-    QString writeFile(const QString& relative, const QByteArray& content);
-
     std::unique_ptr<TestEnvironment> m_env;
-    QList<QUrl> m_openedUrls;
+    std::unique_ptr<UrlCatcher> m_urls;
     QString m_savedFolder;
     QByteArray m_savedPath;
-};
 
-QString tst_GameLauncher::installGame(const QString& relative)
-{
-    const QString path = root(relative);
-    return InstallRecorder(QStringLiteral(LAUNCH_RECORDER), path) ? path : QString();
-}
+    QString root(const QString& relative) const { return m_env->path(relative); }
+    QList<LaunchRecord> records(const QString& program) const { return ReadLaunchRecords(root(u"records"_s), program); }
+    QString installGame(const QString& relative) const
+    {
+        return InstallRecorder(QStringLiteral(LAUNCH_RECORDER), root(relative)) ? root(relative) : QString();
+    }
+    QString write(const QString& relative, const QByteArray& bytes) const
+    {
+        return WriteFile(root(relative), bytes) ? root(relative) : QString();
+    }
 
-QString tst_GameLauncher::writeFile(const QString& relative, const QByteArray& content)
-{
-    const QString path = root(relative);
-    QDir().mkpath(QFileInfo(path).absolutePath());
-    QFile file(path);
-    if (!file.open(QIODevice::WriteOnly) || file.write(content) != content.size())
-        return QString();
-    return path;
-}
+private Q_SLOTS:
+    void init()
+    {
+        m_savedFolder = QDir::currentPath();
+        m_savedPath = qgetenv("PATH");
+        m_env = std::make_unique<TestEnvironment>();
+        m_urls = std::make_unique<UrlCatcher>();
+        QDir().mkpath(root(u"records"_s));
+        qputenv("BV_LAUNCH_RECORD", root(u"records"_s).toLocal8Bit());
+        qputenv("BRIMVAULT_PROGRAM_DIR", root(u"program"_s).toLocal8Bit());
+        // Only our own folder on the PATH: a wine installed on this machine must not take part.
+        qputenv("PATH", root(u"bin"_s).toLocal8Bit());
+        QVERIFY(!installGame(u"program/BrimvaultService"_s).isEmpty());
+    }
+    void cleanup()
+    {
+        QDir::setCurrent(m_savedFolder);
+        qputenv("PATH", m_savedPath);
+        m_urls.reset();
+        m_env.reset();
+    }
 
-void tst_GameLauncher::initTestCase()
-{
-    for (const char* scheme : {"http", "https", "file"})
-        QDesktopServices::setUrlHandler(QString::fromLatin1(scheme), this, "recordOpenedUrl");
-    m_savedPath = qgetenv("PATH");
-}
-
-void tst_GameLauncher::cleanupTestCase()
-{
-    for (const char* scheme : {"http", "https", "file"})
-        QDesktopServices::unsetUrlHandler(QString::fromLatin1(scheme));
-}
-
-void tst_GameLauncher::init()
-{
-    m_savedFolder = QDir::currentPath();
-    m_env = std::make_unique<TestEnvironment>();
-    m_openedUrls.clear();
-    QDir().mkpath(records());
-    qputenv("BV_LAUNCH_RECORD", records().toLocal8Bit());
-    qputenv("BRIMVAULT_PROGRAM_DIR", root(QStringLiteral("program")).toLocal8Bit());
-    // Only our own folder on the PATH: a wine installed on this machine must not take part.
-    qputenv("PATH", root(QStringLiteral("bin")).toLocal8Bit());
-    QVERIFY(installGame(QStringLiteral("program/BrimvaultService")).size() > 0);
-}
-
-void tst_GameLauncher::cleanup()
-{
-    QDir::setCurrent(m_savedFolder);
-    qputenv("PATH", m_savedPath);
-    qunsetenv("BRIMVAULT_PROGRAM_DIR");
-    qunsetenv("BV_LAUNCH_RECORD");
-    m_env.reset();
-}
-
-void tst_GameLauncher::nativeGameStartsInItsOwnFolder_data()
-{
-    QTest::addColumn<QString>("game");
-    QTest::newRow("plain") << QStringLiteral("commonappdata/Brimvault/Lines/lines");
-    QTest::newRow("blanks, unquoted") << QStringLiteral("my games/Space Rocks/space rocks");
-    QTest::newRow("mixed case") << QStringLiteral("Games/MixedCase/Game");
-}
-
-void tst_GameLauncher::nativeGameStartsInItsOwnFolder()
-{
-    QFETCH(QString, game);
-    const QString path = installGame(game);
-    QVERIFY(!path.isEmpty());
-
-    GameLauncher launcher;
-    QSignalSpy movies(&launcher, &GameLauncher::flashMovieRequested);
-    launcher.launchItem(path, QStringLiteral("Caption"));
-
-    const QString program = QFileInfo(path).fileName();
-    QTRY_COMPARE(ReadLaunchRecords(records(), program).size(), 1);
-    const LaunchRecord record = ReadLaunchRecords(records(), program).first();
-    QCOMPARE(record.program, path);
-    QCOMPARE(record.workingFolder, QFileInfo(path).absolutePath());
-    QVERIFY(record.arguments.isEmpty());
-    // The game's folder stays current after the launch.
-    QCOMPARE(QDir::currentPath(), QFileInfo(path).absolutePath());
-    QVERIFY(m_openedUrls.isEmpty());
-    QCOMPARE(movies.count(), 0);
-}
-
-void tst_GameLauncher::openGameOfflineFindsUpperCasedPath()
-{
-    const QString path = installGame(QStringLiteral("Games/Ball Game/ball game"));
-    GameLauncher launcher;
-    launcher.launchOffline(QStringLiteral("  ") + path + QStringLiteral(" "), QString());
-
-    QTRY_COMPARE(ReadLaunchRecords(records(), QStringLiteral("ball game")).size(), 1);
-    const LaunchRecord record = ReadLaunchRecords(records(), QStringLiteral("ball game")).first();
-    QCOMPARE(record.program, path);
-    QCOMPARE(record.workingFolder, root(QStringLiteral("Games/Ball Game")));
-}
-
-void tst_GameLauncher::browserOrProcess_data()
-{
-    QTest::addColumn<QString>("item"); // "{root}" stands for the test's folder
-    QTest::addColumn<QString>("openedUrl"); // empty: nothing goes to the browser
-
-    QTest::newRow("page.HTM") << QStringLiteral("{root}/pages/page.HTM")
-                              << QStringLiteral("file://{root}/pages/page.HTM");
-    QTest::newRow("x.aspx") << QStringLiteral("{root}/pages/x.aspx") << QStringLiteral("file://{root}/pages/x.aspx");
-    QTest::newRow("mht") << QStringLiteral("{root}/pages/saved.mht") << QStringLiteral("file://{root}/pages/saved.mht");
-    QTest::newRow("asp query") << QStringLiteral("http://127.0.0.1:9/Play.ASP?game=5&x=1")
-                               << QStringLiteral("http://127.0.0.1:9/Play.ASP?game=5&x=1");
-    QTest::newRow("catalogue page") << QStringLiteral("http://127.0.0.1:9/online-games-catalog.asp")
-                                    << QStringLiteral("http://127.0.0.1:9/online-games-catalog.asp");
-    QTest::newRow("address without page")
-        << QStringLiteral("https://127.0.0.1:9/games") << QStringLiteral("https://127.0.0.1:9/games");
-    QTest::newRow("x.ht is a process") << QStringLiteral("{root}/pages/x.ht") << QString();
-    QTest::newRow("missing game") << QStringLiteral("{root}/nowhere/game") << QString();
-}
-
-void tst_GameLauncher::browserOrProcess()
-{
-    QFETCH(QString, item);
-    QFETCH(QString, openedUrl);
-    for (const QString& page : {QStringLiteral("pages/page.HTM"), QStringLiteral("pages/x.aspx"),
-             QStringLiteral("pages/saved.mht"), QStringLiteral("pages/x.ht")})
-        QVERIFY(!writeFile(page, "<html></html>").isEmpty());
-    item.replace(QStringLiteral("{root}"), m_env->root());
-    openedUrl.replace(QStringLiteral("{root}"), m_env->root());
-
-    GameLauncher launcher;
-    QSignalSpy movies(&launcher, &GameLauncher::flashMovieRequested);
-    launcher.launchItem(item, QString());
-
-    if (openedUrl.isEmpty())
-        QVERIFY(m_openedUrls.isEmpty());
-    else
-        QCOMPARE(m_openedUrls, QList<QUrl> {QUrl(openedUrl)});
-    QCOMPARE(movies.count(), 0);
-    // Web page or failed start, the service hears of the first launch all the same.
-    QTRY_COMPARE(ReadLaunchRecords(records(), QStringLiteral("BrimvaultService")).size(), 1);
-}
-
-void tst_GameLauncher::flashMovieGoesToMediaHost()
-{
-    const QString movie = writeFile(QStringLiteral("Flash/Jumper.swf"), "FWS");
-    GameLauncher launcher;
-    QSignalSpy movies(&launcher, &GameLauncher::flashMovieRequested);
-
-    launcher.launchItem(movie, QStringLiteral("  Jumper  "));
-    QCOMPARE(movies.count(), 1);
-    QCOMPARE(movies.at(0).at(0).toString(), movie);
-    QCOMPARE(movies.at(0).at(1).toString(), QStringLiteral("Jumper"));
-
-    // Every launch asks for a window of its own.
-    launcher.launchOffline(movie, QStringLiteral("Jumper"));
-    QCOMPARE(movies.count(), 2);
-    QCOMPARE(movies.at(1).at(0).toString(), movie);
-    QVERIFY(m_openedUrls.isEmpty());
-}
-
-void tst_GameLauncher::numberedMovie_data()
-{
-    QTest::addColumn<QString>("movieName");
-    QTest::addColumn<bool>("offline");
-    QTest::addColumn<bool>("connected");
-    QTest::addColumn<bool>("probed"); // whether the catalogue server is asked at all
-    QTest::addColumn<QString>("articleCode"); // empty: the movie plays locally
-
-    const QString numbered = QStringLiteral("20071231235959000001");
-    QTest::newRow("online") << numbered + QStringLiteral(".swf") << false << true << true << numbered;
-    QTest::newRow("longer name, first 20")
-        << numbered + QStringLiteral("77 Racer.swf") << false << true << true << numbered;
-    QTest::newRow("middle not tested") << QStringLiteral("20xx-yy-zz game 0005.swf") << false << true << true
-                                       << QStringLiteral("20xx-yy-zz game 0005");
-    QTest::newRow("open game offline") << numbered + QStringLiteral(".swf") << true << true << false << QString();
-    QTest::newRow("server unreachable") << numbered + QStringLiteral(".swf") << false << false << true << QString();
-    QTest::newRow("shorter than 20") << QStringLiteral("20abc.swf") << false << true << false << QString();
-    QTest::newRow("20th not a digit") << QStringLiteral("200712312359590000xA.swf") << false << true << false
-                                      << QString();
-    QTest::newRow("not starting with 20")
-        << QStringLiteral("19071231235959000001.swf") << false << true << false << QString();
-}
-
-void tst_GameLauncher::numberedMovie()
-{
-    QFETCH(QString, movieName);
-    QFETCH(bool, offline);
-    QFETCH(bool, connected);
-    QFETCH(bool, probed);
-    QFETCH(QString, articleCode);
-    const QString movie = writeFile(QStringLiteral("Flash/") + movieName, "FWS");
-
-    GameLauncher launcher;
-    int probes = 0;
-    launcher.setConnectionProbe([&probes, connected] {
-        ++probes;
-        return connected;
-    });
-    launcher.setCatalogueRoot([] { return QStringLiteral("http://127.0.0.1:9/"); });
-    QSignalSpy movies(&launcher, &GameLauncher::flashMovieRequested);
-    if (offline)
-        launcher.launchOffline(movie, movieName);
-    else
-        launcher.launchItem(movie, movieName);
-
-    QCOMPARE(probes, probed ? 1 : 0);
-    if (articleCode.isEmpty()) {
-        QCOMPARE(movies.count(), 1);
-        QVERIFY(m_openedUrls.isEmpty());
-    } else {
+    // Started in its own folder, which stays current; blanks in the path need no quotes; an item given
+    // with blanks around is found all the same.
+    void nativeGameStartsInItsOwnFolder_data()
+    {
+        QTest::addColumn<QString>("game");
+        QTest::addColumn<bool>("offline");
+        QTest::newRow("plain") << u"commonappdata/Brimvault/Lines/lines"_s << false;
+        QTest::newRow("blanks, mixed case") << u"my games/Space Rocks/Space Rocks"_s << false;
+        QTest::newRow("open game offline") << u"Games/Ball Game/ball game"_s << true;
+    }
+    void nativeGameStartsInItsOwnFolder()
+    {
+        QFETCH(QString, game);
+        QFETCH(bool, offline);
+        const QString path = installGame(game);
+        QVERIFY(!path.isEmpty());
+        GameLauncher launcher;
+        QSignalSpy movies(&launcher, &GameLauncher::flashMovieRequested);
+        if (offline)
+            launcher.launchOffline(u"  "_s + path + u" "_s, QString());
+        else
+            launcher.launchItem(path, u"Caption"_s);
+        const QString program = QFileInfo(path).fileName();
+        QTRY_COMPARE(records(program).size(), 1);
+        QCOMPARE(records(program).first().program, path);
+        QCOMPARE(records(program).first().workingFolder, QFileInfo(path).absolutePath());
+        QVERIFY(records(program).first().arguments.isEmpty());
+        QCOMPARE(QDir::currentPath(), QFileInfo(path).absolutePath());
+        QVERIFY(m_urls->opened.isEmpty());
         QCOMPARE(movies.count(), 0);
-        QCOMPARE(m_openedUrls,
-            QList<QUrl> {QUrl(QStringLiteral("http://127.0.0.1:9/OnlineGamesArticle.asp?code=") + articleCode)});
     }
-}
 
-void tst_GameLauncher::articleNeedsCatalogueServerToAnswer200_data()
-{
-    QTest::addColumn<QByteArray>("statusLine");
-    QTest::addColumn<bool>("articleOpened");
-    QTest::newRow("200") << QByteArray("200 OK") << true;
-    QTest::newRow("302") << QByteArray("302 Found\r\nLocation: /elsewhere") << false;
-    QTest::newRow("304") << QByteArray("304 Not Modified") << false;
-    QTest::newRow("500") << QByteArray("500 Internal Server Error") << false;
-}
-
-void tst_GameLauncher::articleNeedsCatalogueServerToAnswer200()
-{
-    QFETCH(QByteArray, statusLine);
-    QFETCH(bool, articleOpened);
-
-    QTcpServer server;
-    QVERIFY(server.listen(QHostAddress::LocalHost));
-    QList<QByteArray> requests;
-    connect(&server, &QTcpServer::newConnection, this, [&] {
-        QTcpSocket* socket = server.nextPendingConnection();
-        connect(socket, &QTcpSocket::readyRead, socket, [&requests, socket, statusLine] {
-            const QByteArray request = socket->readAll();
-            if (!request.contains("\r\n\r\n"))
-                return;
-            requests.append(request.left(request.indexOf("\r\n")));
-            socket->write("HTTP/1.1 " + statusLine + "\r\nContent-Length: 0\r\nConnection: close\r\n\r\n");
-            socket->disconnectFromHost();
-        });
-    });
-    const QString serverRoot = QStringLiteral("http://127.0.0.1:%1").arg(server.serverPort());
-    qputenv("BRIMVAULT_CATALOGUE_ROOT", serverRoot.toLocal8Bit());
-    const QString code = QStringLiteral("20071231235959000001");
-    const QString movie = writeFile(QStringLiteral("Flash/") + code + QStringLiteral(".swf"), "FWS");
-
-    GameLauncher launcher;
-    QSignalSpy movies(&launcher, &GameLauncher::flashMovieRequested);
-    launcher.launchItem(movie, QStringLiteral("Racer"));
-
-    QCOMPARE(requests.size(), 1);
-    QVERIFY(requests.first().startsWith("GET /GetBrimvaultConnection.asp?rnd="));
-    if (articleOpened) {
-        QCOMPARE(m_openedUrls, QList<QUrl> {QUrl(serverRoot + QStringLiteral("/OnlineGamesArticle.asp?code=") + code)});
+    void browserOrProcess_data()
+    {
+        QTest::addColumn<QString>("item"); // "{root}" stands for the test's folder
+        QTest::addColumn<QString>("openedUrl"); // empty: nothing goes to the browser
+        QTest::newRow("page.HTM") << u"{root}/pages/page.HTM"_s << u"file://{root}/pages/page.HTM"_s;
+        QTest::newRow("x.aspx") << u"{root}/pages/x.aspx"_s << u"file://{root}/pages/x.aspx"_s;
+        QTest::newRow("mht") << u"{root}/pages/saved.mht"_s << u"file://{root}/pages/saved.mht"_s;
+        QTest::newRow("asp query") << u"http://127.0.0.1:9/Play.ASP?game=5&x=1"_s
+                                   << u"http://127.0.0.1:9/Play.ASP?game=5&x=1"_s;
+        QTest::newRow("address without page") << u"https://127.0.0.1:9/games"_s << u"https://127.0.0.1:9/games"_s;
+        QTest::newRow("x.ht is a process") << u"{root}/pages/x.ht"_s << QString();
+        QTest::newRow("missing game") << u"{root}/nowhere/game"_s << QString();
+    }
+    void browserOrProcess()
+    {
+        QFETCH(QString, item);
+        QFETCH(QString, openedUrl);
+        for (const QString& page : {u"page.HTM"_s, u"x.aspx"_s, u"saved.mht"_s, u"x.ht"_s})
+            QVERIFY(!write(u"pages/"_s + page, "<html></html>").isEmpty());
+        GameLauncher launcher;
+        QSignalSpy movies(&launcher, &GameLauncher::flashMovieRequested);
+        launcher.launchItem(item.replace(u"{root}"_s, m_env->root()), QString());
+        const QList<QUrl> expected {QUrl(openedUrl.replace(u"{root}"_s, m_env->root()))};
+        QCOMPARE(m_urls->opened, openedUrl.isEmpty() ? QList<QUrl>() : expected);
         QCOMPARE(movies.count(), 0);
-    } else {
-        QVERIFY(m_openedUrls.isEmpty());
-        QCOMPARE(movies.count(), 1);
+        // Web page or failed start, the service hears of the first launch all the same.
+        QTRY_COMPARE(records(u"BrimvaultService"_s).size(), 1);
     }
-}
 
-void tst_GameLauncher::serviceSignalledOncePerRun()
-{
-    const QString first = installGame(QStringLiteral("games/One/one"));
-    const QString second = installGame(QStringLiteral("games/Two/two"));
-    GameLauncher launcher;
-    QVERIFY(!launcher.serviceSignalled());
-
-    launcher.launchItem(first, QString());
-    QVERIFY(launcher.serviceSignalled());
-    QTRY_COMPARE(ReadLaunchRecords(records(), QStringLiteral("BrimvaultService")).size(), 1);
-    const LaunchRecord service = ReadLaunchRecords(records(), QStringLiteral("BrimvaultService")).first();
-    QCOMPARE(service.program, root(QStringLiteral("program/BrimvaultService")));
-    QCOMPARE(service.arguments, QStringList {QStringLiteral("-R")});
-
-    launcher.launchItem(second, QString());
-    launcher.launchItem(first, QString());
-    QTRY_COMPARE(ReadLaunchRecords(records(), QStringLiteral("two")).size(), 1);
-    QTRY_COMPARE(ReadLaunchRecords(records(), QStringLiteral("one")).size(), 2);
-    QTest::qWait(200);
-    QCOMPARE(ReadLaunchRecords(records(), QStringLiteral("BrimvaultService")).size(), 1);
-
-    // A new run of the program (a new main window) signals again.
-    GameLauncher nextRun;
-    nextRun.launchItem(first, QString());
-    QTRY_COMPARE(ReadLaunchRecords(records(), QStringLiteral("BrimvaultService")).size(), 2);
-}
-
-void tst_GameLauncher::failedLaunchStillSignalsService()
-{
-    GameLauncher launcher;
-    launcher.launchItem(root(QStringLiteral("games/Gone/gone")), QString());
-    QVERIFY(launcher.serviceSignalled());
-    QTRY_COMPARE(ReadLaunchRecords(records(), QStringLiteral("BrimvaultService")).size(), 1);
-
-    // Without a service executable the launch is just as silent.
-    QFile::remove(root(QStringLiteral("program/BrimvaultService")));
-    GameLauncher another;
-    another.launchItem(root(QStringLiteral("games/Gone/gone")), QString());
-    QVERIFY(another.serviceSignalled());
-}
-
-void tst_GameLauncher::windowsGameThroughRunner_data()
-{
-    QTest::addColumn<QString>("runnerSetting"); // "{root}" stands for the test's folder; null: not set
-    QTest::addColumn<QString>("runnerFile"); // where the recorder stands in for the runner
-    QTest::addColumn<QStringList>("runnerArguments"); // before the game's path
-
-    QTest::newRow("setting with arguments")
-        << QStringLiteral("\"{root}/runners/my runner\" --quiet -x") << QStringLiteral("runners/my runner")
-        << QStringList {QStringLiteral("--quiet"), QStringLiteral("-x")};
-    QTest::newRow("setting, name on PATH")
-        << QStringLiteral("proton-run") << QStringLiteral("bin/proton-run") << QStringList();
-    QTest::newRow("default wine on PATH") << QString() << QStringLiteral("bin/wine") << QStringList();
-    QTest::newRow("blank setting is the default")
-        << QStringLiteral("   ") << QStringLiteral("bin/wine") << QStringList();
-}
-
-void tst_GameLauncher::windowsGameThroughRunner()
-{
-    QFETCH(QString, runnerSetting);
-    QFETCH(QString, runnerFile);
-    QFETCH(QStringList, runnerArguments);
-    QVERIFY(!installGame(runnerFile).isEmpty());
-    if (!runnerSetting.isNull()) {
-        runnerSetting.replace(QStringLiteral("{root}"), m_env->root());
-        QVERIFY(SaveSetting(
-            AppTitle(), CatalogueKeys::SettingsSection, QStringLiteral("CompatibilityRunner"), runnerSetting));
+    // A movie plays in a media host window of its own (trimmed caption), unless it is named like a catalogue
+    // code and the catalogue server answers: then its article opens.
+    void numberedMovie_data()
+    {
+        QTest::addColumn<QString>("movieName");
+        QTest::addColumn<bool>("offline");
+        QTest::addColumn<bool>("connected");
+        QTest::addColumn<bool>("probed");
+        QTest::addColumn<QString>("articleCode"); // empty: the movie plays locally
+        const QString numbered = u"20071231235959000001"_s;
+        QTest::newRow("online") << numbered + u".swf"_s << false << true << true << numbered;
+        QTest::newRow("longer name, first 20") << numbered + u"77 Racer.swf"_s << false << true << true << numbered;
+        QTest::newRow("middle not tested")
+            << u"20xx-yy-zz game 0005.swf"_s << false << true << true << u"20xx-yy-zz game 0005"_s;
+        QTest::newRow("open game offline") << numbered + u".swf"_s << true << true << false << QString();
+        QTest::newRow("server unreachable") << numbered + u".swf"_s << false << false << true << QString();
+        QTest::newRow("shorter than 20") << u"20abc.swf"_s << false << true << false << QString();
+        QTest::newRow("20th not a digit") << u"200712312359590000xA.swf"_s << false << true << false << QString();
+        QTest::newRow("not starting with 20") << u"19071231235959000001.swf"_s << false << true << false << QString();
     }
-    const QString game = writeFile(QStringLiteral("Program Files/Card Games/sol.exe"), QByteArray("MZ\x90\x00", 4));
+    void numberedMovie()
+    {
+        QFETCH(QString, movieName);
+        QFETCH(bool, offline);
+        QFETCH(bool, connected);
+        QFETCH(QString, articleCode);
+        const QString movie = write(u"Flash/"_s + movieName, "FWS");
+        GameLauncher launcher;
+        int probes = 0;
+        launcher.setConnectionProbe([&probes, connected] { return ++probes, connected; });
+        launcher.setCatalogueRoot([] { return u"http://127.0.0.1:9/"_s; });
+        QSignalSpy movies(&launcher, &GameLauncher::flashMovieRequested);
+        const QString caption = u"  "_s + movieName + u"  "_s;
+        offline ? launcher.launchOffline(movie, caption) : launcher.launchItem(movie, caption);
+        QFETCH(bool, probed);
+        QCOMPARE(probes, probed ? 1 : 0);
+        QCOMPARE(movies.count(), articleCode.isEmpty() ? 1 : 0);
+        if (articleCode.isEmpty())
+            QCOMPARE(movies.first(), QVariantList({movie, movieName}));
+        const QList<QUrl> article {QUrl(u"http://127.0.0.1:9/OnlineGamesArticle.asp?code="_s + articleCode)};
+        QCOMPARE(m_urls->opened, articleCode.isEmpty() ? QList<QUrl>() : article);
+    }
 
-    GameLauncher launcher;
-    launcher.launchItem(game, QString());
+    // Without a probe of its own the launcher asks the catalogue server itself.
+    void articleAsksTheCatalogueServer()
+    {
+        LocalHttpServer server;
+        QVERIFY(server.isListening());
+        qputenv("BRIMVAULT_CATALOGUE_ROOT", server.root().toLocal8Bit());
+        const QString movie = write(u"Flash/20071231235959000001.swf"_s, "FWS");
+        GameLauncher launcher;
+        launcher.launchItem(movie, u"Racer"_s);
+        QCOMPARE(server.targets.size(), 1);
+        QVERIFY(server.targets.first().startsWith(u"/GetBrimvaultConnection.asp?rnd="));
+        QCOMPARE(m_urls->opened,
+            QList<QUrl>({QUrl(server.root() + u"/OnlineGamesArticle.asp?code=20071231235959000001"_s)}));
+    }
 
-    const QString runnerName = QFileInfo(runnerFile).fileName();
-    QTRY_COMPARE(ReadLaunchRecords(records(), runnerName).size(), 1);
-    const LaunchRecord record = ReadLaunchRecords(records(), runnerName).first();
-    QCOMPARE(record.program, root(runnerFile));
-    QCOMPARE(record.arguments, runnerArguments << game);
-    QCOMPARE(record.workingFolder, root(QStringLiteral("Program Files/Card Games")));
-}
+    // Once per run of the program (per launcher), even when the launch fails or the service is missing.
+    void serviceSignalledOncePerRun()
+    {
+        const QString first = installGame(u"games/One/one"_s);
+        GameLauncher launcher;
+        QVERIFY(!launcher.serviceSignalled());
+        launcher.launchItem(first, QString());
+        QVERIFY(launcher.serviceSignalled());
+        QTRY_COMPARE(records(u"BrimvaultService"_s).size(), 1);
+        QCOMPARE(records(u"BrimvaultService"_s).first().program, root(u"program/BrimvaultService"_s));
+        QCOMPARE(records(u"BrimvaultService"_s).first().arguments, QStringList {u"-R"_s});
+        launcher.launchItem(root(u"games/Gone/gone"_s), QString());
+        launcher.launchItem(first, QString());
+        QTRY_COMPARE(records(u"one"_s).size(), 2);
+        QTest::qWait(200);
+        QCOMPARE(records(u"BrimvaultService"_s).size(), 1);
 
-void tst_GameLauncher::withoutRunnerWindowsGameFailsSilently()
-{
-    const QString game = writeFile(QStringLiteral("games/Win/game.exe"), QByteArray("MZ\x90\x00", 4));
-    // A runner named in the settings that is not there fails the same way as no runner at all.
-    for (const QString& runner : {QString(), QStringLiteral("no-such-runner-brimvault")}) {
-        QVERIFY(SaveSetting(AppTitle(), CatalogueKeys::SettingsSection, QStringLiteral("CompatibilityRunner"), runner));
+        GameLauncher nextRun;
+        nextRun.launchItem(root(u"games/Gone/gone"_s), QString());
+        QTRY_COMPARE(records(u"BrimvaultService"_s).size(), 2);
+        QFile::remove(root(u"program/BrimvaultService"_s));
+        GameLauncher withoutService;
+        withoutService.launchItem(first, QString());
+        QVERIFY(withoutService.serviceSignalled());
+    }
+
+    // No runner, or one named in the settings that is not there: the game fails silently, the service runs.
+    void windowsGameThroughRunner_data()
+    {
+        QTest::addColumn<QString>("runnerSetting"); // "{root}" stands for the test's folder; null: not set
+        QTest::addColumn<QString>("runnerFile"); // where the recorder stands in for the runner; "": none
+        QTest::addColumn<QStringList>("runnerArguments"); // before the game's path
+        QTest::newRow("setting with arguments") << u"\"{root}/runners/my runner\" --quiet -x"_s
+                                                << u"runners/my runner"_s << QStringList {u"--quiet"_s, u"-x"_s};
+        QTest::newRow("setting, name on PATH") << u"proton-run"_s << u"bin/proton-run"_s << QStringList();
+        QTest::newRow("default wine on PATH") << QString() << u"bin/wine"_s << QStringList();
+        QTest::newRow("blank setting is the default") << u"   "_s << u"bin/wine"_s << QStringList();
+        QTest::newRow("no runner") << QString() << QString() << QStringList();
+        QTest::newRow("runner missing") << u"no-such-runner-brimvault"_s << QString() << QStringList();
+    }
+    void windowsGameThroughRunner()
+    {
+        QFETCH(QString, runnerSetting);
+        QFETCH(QString, runnerFile);
+        QFETCH(QStringList, runnerArguments);
+        QVERIFY(runnerFile.isEmpty() || !installGame(runnerFile).isEmpty());
+        if (!runnerSetting.isNull())
+            QVERIFY(SaveSetting(AppTitle(), CatalogueKeys::SettingsSection, u"CompatibilityRunner"_s,
+                runnerSetting.replace(u"{root}"_s, m_env->root())));
+        const QString game = write(u"Program Files/Card Games/sol.exe"_s, QByteArray("MZ\x90\x00", 4));
         GameLauncher launcher;
         QSignalSpy movies(&launcher, &GameLauncher::flashMovieRequested);
         launcher.launchItem(game, QString());
+        QTRY_COMPARE(records(u"BrimvaultService"_s).size(), 1);
         QCOMPARE(movies.count(), 0);
-        QVERIFY(m_openedUrls.isEmpty());
+        QVERIFY(m_urls->opened.isEmpty());
+        if (runnerFile.isEmpty()) {
+            QTest::qWait(200);
+            QCOMPARE(QDir(root(u"records"_s)).entryList(QDir::Files), QStringList {u"BrimvaultService.record"_s});
+            return;
+        }
+        const QString runner = QFileInfo(runnerFile).fileName();
+        QTRY_COMPARE(records(runner).size(), 1);
+        QCOMPARE(records(runner).first().program, root(runnerFile));
+        QCOMPARE(records(runner).first().arguments, runnerArguments << game);
+        QCOMPARE(records(runner).first().workingFolder, root(u"Program Files/Card Games"_s));
     }
-    // Only the service ran: once per launcher, nothing for the game.
-    QTRY_COMPARE(ReadLaunchRecords(records(), QStringLiteral("BrimvaultService")).size(), 2);
-    const QStringList recorded = QDir(records()).entryList(QDir::Files);
-    QCOMPARE(recorded, QStringList {QStringLiteral("BrimvaultService.record")});
-}
-
-QTEST_MAIN(tst_GameLauncher)
+};
+BV_REGISTER_TEST(TestGameLauncher);
 #include "tst_gamelauncher.moc"

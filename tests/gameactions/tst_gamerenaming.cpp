@@ -1,123 +1,92 @@
 #include "gameactions/GameRenaming.h"
 
-#include "TestEnvironment.h"
 #include "store/CatalogueKeys.h"
 #include "store/CatalogueStore.h"
 #include "store/SettingsStore.h"
-#include "support/UserPrompt.h"
 
-#include <QTest>
+#include "PromptRecorder.h"
+#include "TestEnvironment.h"
+#include "TestSuite.h"
 
 using namespace Brimvault;
+using namespace Qt::StringLiterals;
 
-class tst_GameRenaming : public QObject {
+class TestGameRenaming : public QObject {
     Q_OBJECT
+    std::unique_ptr<TestEnvironment> m_env;
+    std::unique_ptr<PromptRecorder> m_prompts;
 
-private Q_SLOTS:
-    void init();
-    void cleanup();
-    void addedGameKeepsItsNumber();
-    void discoveredGameIsRecordedAsAdded();
-    void nothingChanges_data();
-    void nothingChanges();
-
-private:
-    QString nameOf(const QString& fileNameKey) const
+    static QString nameOf(const QString& key)
     {
-        return GetSetting(AppTitle(), CatalogueKeys::FilesNamesSection, fileNameKey, QStringLiteral("<none>"));
+        return GetSetting(AppTitle(), CatalogueKeys::FilesNamesSection, key, u"<none>"_s);
+    }
+    std::optional<QString> rename(const QString& caption, const QString& path, const QString& answer)
+    {
+        m_prompts->inputText = answer;
+        return AskAndRenameGame(caption, path);
     }
 
-    std::unique_ptr<TestEnvironment> m_env;
-    QList<InputRequest> m_questions;
-    std::optional<QString> m_answer;
+private Q_SLOTS:
+    void init()
+    {
+        m_env = std::make_unique<TestEnvironment>();
+        m_prompts = std::make_unique<PromptRecorder>();
+    }
+    void cleanup()
+    {
+        m_prompts.reset();
+        m_env.reset();
+    }
+
+    // The first entry of the path (matched trimmed, in any case) takes the name; a later duplicate does not.
+    void addedGameKeepsItsNumber()
+    {
+        CatalogueStore::AddGame(u"/games/a.exe"_s);
+        CatalogueStore::AddGame(u" /Games/Tetra/tetra.swf "_s);
+        CatalogueStore::AddGame(u"/games/tetra/TETRA.SWF"_s);
+        QCOMPARE(rename(u"  Tetra  "_s, u"/games/tetra/tetra.swf"_s, u"Falling Blocks"_s),
+            std::optional<QString>(u"Falling Blocks"_s));
+        QCOMPARE(m_prompts->inputs.size(), 1);
+        QCOMPARE(m_prompts->inputs.first().prompt, u"Edit game name"_s);
+        QCOMPARE(m_prompts->inputs.first().title, u"Brimvault"_s);
+        QCOMPARE(m_prompts->inputs.first().defaultText, u"Tetra"_s);
+        QCOMPARE(nameOf(u"FileName2"_s), u"Falling Blocks"_s);
+        QCOMPARE(nameOf(u"FileName3"_s), u"<none>"_s);
+        QCOMPARE(CatalogueStore::EntryCount(), 3);
+    }
+
+    // A discovered game becomes an added one under its upper-cased path; renaming it again finds that entry.
+    void discoveredGameIsRecordedAsAdded()
+    {
+        const QString windowsGame = u"/windows/system32/sol.exe"_s;
+        QVERIFY(rename(u"Solitaire"_s, windowsGame, u"Patience"_s).has_value());
+        QCOMPARE(GetSetting(AppTitle(), CatalogueKeys::FilesSection, u"File1"_s), u"/WINDOWS/SYSTEM32/SOL.EXE"_s);
+        QCOMPARE(nameOf(u"FileName1"_s), u"Patience"_s);
+        QVERIFY(rename(u"Patience"_s, windowsGame, u"Klondike"_s).has_value());
+        QCOMPARE(CatalogueStore::EntryCount(), 1);
+        QCOMPARE(nameOf(u"FileName1"_s), u"Klondike"_s);
+    }
+
+    void nothingChanges_data()
+    {
+        QTest::addColumn<QString>("item");
+        QTest::addColumn<std::optional<QString>>("answer");
+        QTest::addColumn<int>("questions");
+        QTest::newRow("cancel") << u"/games/x.exe"_s << std::optional<QString>() << 1;
+        QTest::newRow("empty answer") << u"/games/x.exe"_s << std::optional<QString>(QString()) << 1;
+        QTest::newRow("web entry") << u"http://127.0.0.1:9/online-games-catalog.asp"_s << std::optional(u"Web"_s) << 0;
+        QTest::newRow("web entry, blanks and case") << u"  Https://127.0.0.1:9/"_s << std::optional(u"Web"_s) << 0;
+    }
+    void nothingChanges()
+    {
+        QFETCH(QString, item);
+        QFETCH(std::optional<QString>, answer);
+        m_prompts->inputText = answer;
+        QVERIFY(!AskAndRenameGame(u"Caption"_s, item).has_value());
+        QTEST(int(m_prompts->inputs.size()), "questions");
+        QVERIFY(GetAllSettings(AppTitle(), CatalogueKeys::FilesSection).isEmpty());
+        QVERIFY(GetAllSettings(AppTitle(), CatalogueKeys::FilesNamesSection).isEmpty());
+    }
 };
-
-void tst_GameRenaming::init()
-{
-    m_env = std::make_unique<TestEnvironment>();
-    m_questions.clear();
-    m_answer = QStringLiteral("New Name");
-    SetInputHandler([this](const InputRequest& request) {
-        m_questions.append(request);
-        return m_answer;
-    });
-}
-
-void tst_GameRenaming::cleanup()
-{
-    SetInputHandler({});
-    m_env.reset();
-}
-
-void tst_GameRenaming::addedGameKeepsItsNumber()
-{
-    CatalogueStore::AddGame(QStringLiteral("/games/a.exe"));
-    const QString key = CatalogueStore::AddGame(QStringLiteral(" /Games/Tetra/tetra.swf "));
-    CatalogueStore::AddGame(QStringLiteral("/games/tetra/TETRA.SWF")); // a later duplicate is not renamed
-
-    m_answer = QStringLiteral("Falling Blocks");
-    QCOMPARE(AskAndRenameGame(QStringLiteral("  Tetra  "), QStringLiteral("/games/tetra/tetra.swf")),
-        std::optional<QString>(QStringLiteral("Falling Blocks")));
-
-    QCOMPARE(m_questions.size(), 1);
-    QCOMPARE(m_questions.first().prompt, QStringLiteral("Edit game name"));
-    QCOMPARE(m_questions.first().title, QStringLiteral("Brimvault"));
-    QCOMPARE(m_questions.first().defaultText, QStringLiteral("Tetra"));
-    QCOMPARE(nameOf(CatalogueStore::DisplayNameKey(key)), QStringLiteral("Falling Blocks"));
-    QCOMPARE(nameOf(QStringLiteral("FileName3")), QStringLiteral("<none>"));
-    QCOMPARE(CatalogueStore::EntryCount(), 3);
-    QCOMPARE(CatalogueStore::AddedGames().size(), 3);
-}
-
-void tst_GameRenaming::discoveredGameIsRecordedAsAdded()
-{
-    CatalogueStore::AddGame(QStringLiteral("/games/a.exe"));
-    CatalogueStore::AddGame(QStringLiteral("/games/b.exe"));
-    CatalogueStore::RemoveGame(QStringLiteral("File2"));
-    const QString windowsGame = QStringLiteral("/windows/system32/sol.exe");
-
-    m_answer = QStringLiteral("Patience");
-    QCOMPARE(
-        AskAndRenameGame(QStringLiteral("Solitaire"), windowsGame), std::optional<QString>(QStringLiteral("Patience")));
-
-    // A new number after the highest given out, never a gap; the path as the list holds it, upper-cased.
-    QCOMPARE(CatalogueStore::EntryCount(), 3);
-    QCOMPARE(GetSetting(AppTitle(), CatalogueKeys::FilesSection, QStringLiteral("File3")), windowsGame.toUpper());
-    QCOMPARE(nameOf(QStringLiteral("FileName3")), QStringLiteral("Patience"));
-
-    // Renaming it again finds the new entry instead of adding another one.
-    m_answer = QStringLiteral("Klondike");
-    QVERIFY(AskAndRenameGame(QStringLiteral("Patience"), windowsGame).has_value());
-    QCOMPARE(CatalogueStore::EntryCount(), 3);
-    QCOMPARE(nameOf(QStringLiteral("FileName3")), QStringLiteral("Klondike"));
-}
-
-void tst_GameRenaming::nothingChanges_data()
-{
-    QTest::addColumn<QString>("data");
-    QTest::addColumn<std::optional<QString>>("answer");
-    QTest::addColumn<int>("questions");
-
-    QTest::newRow("cancel") << QStringLiteral("/games/x.exe") << std::optional<QString>() << 1;
-    QTest::newRow("empty answer") << QStringLiteral("/games/x.exe") << std::optional<QString>(QString()) << 1;
-    QTest::newRow("web entry") << QStringLiteral("http://127.0.0.1:9/online-games-catalog.asp")
-                               << std::optional<QString>(QStringLiteral("Web")) << 0;
-    QTest::newRow("web entry, blanks and case")
-        << QStringLiteral("  Https://127.0.0.1:9/") << std::optional<QString>(QStringLiteral("Web")) << 0;
-}
-
-void tst_GameRenaming::nothingChanges()
-{
-    QFETCH(QString, data);
-    QFETCH(std::optional<QString>, answer);
-    QFETCH(int, questions);
-    m_answer = answer;
-
-    QVERIFY(!AskAndRenameGame(QStringLiteral("Caption"), data).has_value());
-    QCOMPARE(m_questions.size(), questions);
-    QVERIFY(GetAllSettings(AppTitle(), CatalogueKeys::FilesSection).isEmpty());
-    QVERIFY(GetAllSettings(AppTitle(), CatalogueKeys::FilesNamesSection).isEmpty());
-}
-
-QTEST_GUILESS_MAIN(tst_GameRenaming)
+BV_REGISTER_TEST(TestGameRenaming);
 #include "tst_gamerenaming.moc"

@@ -1,137 +1,104 @@
 #include "gameactions/ItemMenuDelay.h"
 #include "gameactions/ServiceSignal.h"
 
-#include "TestEnvironment.h"
 #include "store/CatalogueKeys.h"
 #include "store/SettingsStore.h"
 
+#include "TestEnvironment.h"
+#include "TestSuite.h"
+
 #include <QElapsedTimer>
 #include <QSignalSpy>
-#include <QTest>
 
 using namespace Brimvault;
+using namespace Qt::StringLiterals;
 
-class tst_Timers : public QObject {
+class TestTimers : public QObject {
     Q_OBJECT
-
-private Q_SLOTS:
-    void init();
-    void cleanup();
-    void newGameInstalled_data();
-    void newGameInstalled();
-    void watcherPollsEveryThreeSeconds();
-    void rightClickOpensMenuOnceAfterDelay();
-    void otherButtonsDoNothing_data();
-    void otherButtonsDoNothing();
-
-private:
-    QString signalValue() const
+    std::unique_ptr<TestEnvironment> m_env;
+    static QString signalValue()
     {
-        return GetSetting(
-            AppTitle(), CatalogueKeys::CommandsSection, CatalogueKeys::NewGameInstalledKey, QStringLiteral("<none>"));
+        return GetSetting(AppTitle(), CatalogueKeys::CommandsSection, CatalogueKeys::NewGameInstalledKey, u"<none>"_s);
     }
 
-    std::unique_ptr<TestEnvironment> m_env;
+private Q_SLOTS:
+    void init() { m_env = std::make_unique<TestEnvironment>(); }
+    void cleanup() { m_env.reset(); }
+
+    // Only the exact text "1" is the signal; it is taken once, by writing "0".
+    void newGameInstalled_data()
+    {
+        QTest::addColumn<QString>("stored"); // null: no value at all
+        QTest::addColumn<bool>("rebuild");
+        QTest::addColumn<QString>("afterwards");
+        QTest::newRow("1") << u"1"_s << true << u"0"_s;
+        QTest::newRow("0") << u"0"_s << false << u"0"_s;
+        QTest::newRow("missing") << QString() << false << u"<none>"_s;
+        QTest::newRow("2") << u"2"_s << false << u"2"_s;
+        QTest::newRow("blank before 1") << u" 1"_s << false << u" 1"_s;
+        QTest::newRow("1 and blank") << u"1 "_s << false << u"1 "_s;
+        QTest::newRow("01") << u"01"_s << false << u"01"_s;
+    }
+    void newGameInstalled()
+    {
+        QFETCH(QString, stored);
+        if (!stored.isNull())
+            QVERIFY(
+                SaveSetting(AppTitle(), CatalogueKeys::CommandsSection, CatalogueKeys::NewGameInstalledKey, stored));
+        QTEST(TakeNewGameInstalledSignal(), "rebuild");
+        QTEST(signalValue(), "afterwards");
+        QVERIFY(!TakeNewGameInstalledSignal());
+    }
+
+    void watcherPollsEveryThreeSeconds()
+    {
+        ServiceSignalWatcher watcher;
+        QSignalSpy rebuilds(&watcher, &ServiceSignalWatcher::rebuildRequested);
+        QElapsedTimer clock;
+        clock.start();
+        // Written by the key's other spelling, as another process might.
+        QVERIFY(SaveSetting(AppTitle(), u"COMMANDS"_s, u"newgameinstalled"_s, u"1"_s));
+        QTRY_COMPARE_WITH_TIMEOUT(rebuilds.count(), 1, 6000);
+        // Coarse timers may tick up to 5% early.
+        QVERIFY(clock.elapsed() >= 2700);
+        QCOMPARE(signalValue(), u"0"_s);
+        watcher.poll();
+        QCOMPARE(rebuilds.count(), 1);
+    }
+
+    // The right button (2) opens the menu once, 60 ms later; other buttons do nothing.
+    void itemMenuDelay_data()
+    {
+        QTest::addColumn<int>("button");
+        QTest::addColumn<int>("menus");
+        QTest::newRow("right") << 2 << 1;
+        QTest::newRow("left") << 1 << 0;
+        QTest::newRow("middle") << 4 << 0;
+        QTest::newRow("none") << 0 << 0;
+    }
+    void itemMenuDelay()
+    {
+        QFETCH(int, button);
+        QFETCH(int, menus);
+        ItemMenuDelay delay;
+        QSignalSpy shown(&delay, &ItemMenuDelay::showItemMenu);
+        QElapsedTimer clock;
+        clock.start();
+        delay.mouseButtonPressed(button);
+        QCOMPARE(delay.isPending(), menus == 1);
+        delay.mouseButtonPressed(button);
+        QCOMPARE(shown.count(), 0);
+        QTest::qWait(180);
+        QCOMPARE(shown.count(), menus);
+        QVERIFY(!delay.isPending());
+        if (menus == 0)
+            return;
+        QSignalSpy again(&delay, &ItemMenuDelay::showItemMenu);
+        clock.restart();
+        delay.mouseButtonPressed(button);
+        QTRY_COMPARE(again.count(), 1);
+        QVERIFY(clock.elapsed() >= 55);
+    }
 };
-
-void tst_Timers::init()
-{
-    m_env = std::make_unique<TestEnvironment>();
-}
-
-void tst_Timers::cleanup()
-{
-    m_env.reset();
-}
-
-void tst_Timers::newGameInstalled_data()
-{
-    QTest::addColumn<QString>("stored"); // null: no value at all
-    QTest::addColumn<bool>("rebuild");
-    QTest::addColumn<QString>("afterwards");
-
-    QTest::newRow("1") << QStringLiteral("1") << true << QStringLiteral("0");
-    QTest::newRow("0") << QStringLiteral("0") << false << QStringLiteral("0");
-    QTest::newRow("missing") << QString() << false << QStringLiteral("<none>");
-    QTest::newRow("2") << QStringLiteral("2") << false << QStringLiteral("2");
-    QTest::newRow("blank before 1") << QStringLiteral(" 1") << false << QStringLiteral(" 1");
-    QTest::newRow("1 and blank") << QStringLiteral("1 ") << false << QStringLiteral("1 ");
-    QTest::newRow("yes") << QStringLiteral("yes") << false << QStringLiteral("yes");
-    QTest::newRow("01") << QStringLiteral("01") << false << QStringLiteral("01");
-}
-
-void tst_Timers::newGameInstalled()
-{
-    QFETCH(QString, stored);
-    QFETCH(bool, rebuild);
-    QFETCH(QString, afterwards);
-    if (!stored.isNull())
-        QVERIFY(SaveSetting(AppTitle(), CatalogueKeys::CommandsSection, CatalogueKeys::NewGameInstalledKey, stored));
-
-    QCOMPARE(TakeNewGameInstalledSignal(), rebuild);
-    QCOMPARE(signalValue(), afterwards);
-    // The signal is taken once.
-    QVERIFY(!TakeNewGameInstalledSignal());
-}
-
-void tst_Timers::watcherPollsEveryThreeSeconds()
-{
-    ServiceSignalWatcher watcher;
-    QSignalSpy rebuilds(&watcher, &ServiceSignalWatcher::rebuildRequested);
-    QElapsedTimer clock;
-    clock.start();
-    // Written by the key's other spelling, as another process might.
-    QVERIFY(
-        SaveSetting(AppTitle(), QStringLiteral("COMMANDS"), QStringLiteral("newgameinstalled"), QStringLiteral("1")));
-
-    QTRY_COMPARE_WITH_TIMEOUT(rebuilds.count(), 1, 6000);
-    // Coarse timers may tick up to 5% early.
-    QVERIFY(clock.elapsed() >= ServiceSignalWatcher::PollIntervalMs * 9 / 10);
-    QCOMPARE(signalValue(), QStringLiteral("0"));
-
-    watcher.poll();
-    QCOMPARE(rebuilds.count(), 1);
-}
-
-void tst_Timers::rightClickOpensMenuOnceAfterDelay()
-{
-    ItemMenuDelay delay;
-    QSignalSpy menus(&delay, &ItemMenuDelay::showItemMenu);
-    QElapsedTimer clock;
-    clock.start();
-    delay.mouseButtonPressed(ItemMenuDelay::RightButton);
-    QVERIFY(delay.isPending());
-    delay.mouseButtonPressed(ItemMenuDelay::RightButton);
-    QCOMPARE(menus.count(), 0);
-
-    QTRY_COMPARE(menus.count(), 1);
-    QVERIFY(clock.elapsed() >= ItemMenuDelay::DelayMs - 5);
-    QVERIFY(!delay.isPending());
-    QTest::qWait(3 * ItemMenuDelay::DelayMs);
-    QCOMPARE(menus.count(), 1);
-
-    delay.mouseButtonPressed(ItemMenuDelay::RightButton);
-    QTRY_COMPARE(menus.count(), 2);
-}
-
-void tst_Timers::otherButtonsDoNothing_data()
-{
-    QTest::addColumn<int>("button");
-    QTest::newRow("left") << 1;
-    QTest::newRow("middle") << 4;
-    QTest::newRow("none") << 0;
-}
-
-void tst_Timers::otherButtonsDoNothing()
-{
-    QFETCH(int, button);
-    ItemMenuDelay delay;
-    QSignalSpy menus(&delay, &ItemMenuDelay::showItemMenu);
-    delay.mouseButtonPressed(button);
-    QVERIFY(!delay.isPending());
-    QTest::qWait(3 * ItemMenuDelay::DelayMs);
-    QCOMPARE(menus.count(), 0);
-}
-
-QTEST_GUILESS_MAIN(tst_Timers)
+BV_REGISTER_TEST(TestTimers);
 #include "tst_timers.moc"

@@ -1,51 +1,66 @@
-#include "IconTestSupport.h"
+#include "PeFixtures.h"
+#include "ProgramRun.h"
 #include "TestEnvironment.h"
+#include "TestFiles.h"
+#include "TestSuite.h"
 #include "app/clsFileVersion.h"
+#include "icons/IconCommands.h"
 #include "icons/VersionResource.h"
 
-#include <QJsonObject>
-#include <QTest>
+#include <QProcess>
+#include <QTextStream>
+#include <QtEndian>
 
 using namespace Brimvault;
 using namespace Qt::StringLiterals;
+
+namespace {
+
+QStringList fields(const clsFileVersion& version)
+{
+    return {version.CompanyName(), version.FileDescription(), version.FileVersion(), version.InternalName(),
+        version.LegalCopyright(), version.OriginalFileName(), version.ProductName(), version.ProductVersion()};
+}
+
+QByteArray text(const QString& value)
+{
+    return QByteArray(reinterpret_cast<const char*>(value.utf16()), value.size() * 2).append(2, '\0');
+}
+
+QByteArray padded(QByteArray bytes)
+{
+    return bytes.append((4 - bytes.size() % 4) % 4, '\0');
+}
+
+// A VS_VERSIONINFO node: length, value length, type, key, padding, value, padding, children.
+QByteArray node(
+    const QString& key, const QByteArray& value, quint16 type, quint16 valueLength, const QByteArray& children = {})
+{
+    QByteArray out = padded(padded(QByteArray(6, '\0') + text(key)) + value) + children;
+    qToLittleEndian<quint16>(quint16(out.size()), out.data());
+    qToLittleEndian<quint16>(valueLength, out.data() + 2);
+    qToLittleEndian<quint16>(type, out.data() + 4);
+    return out;
+}
+
+// A version block whose string table `table` holds CompanyName = value (value length as given), translated
+// 0419/04E3.
+QByteArray versionBlock(const QString& table, const QByteArray& value, quint16 valueLength)
+{
+    const QByteArray translation = node(u"Translation"_s, QByteArray("\x19\x04\xe3\x04", 4), 0, 4);
+    const QByteArray strings
+        = node(u"StringFileInfo"_s, {}, 1, 0, node(table, {}, 1, 0, node(u"CompanyName"_s, value, 1, valueLength)));
+    return node(
+        u"VS_VERSION_INFO"_s, QByteArray(52, '\0'), 0, 52, strings + node(u"VarFileInfo"_s, {}, 1, 0, translation));
+}
+
+} // namespace
 
 class TestFileVersion : public QObject {
     Q_OBJECT
 
 private:
     TestEnvironment m_env;
-
-    static QStringList fields(const clsFileVersion& version)
-    {
-        return {version.CompanyName(), version.FileDescription(), version.FileVersion(), version.InternalName(),
-            version.LegalCopyright(), version.OriginalFileName(), version.ProductName(), version.ProductVersion()};
-    }
-
-    // A VS_VERSIONINFO node: header, key, padding, value, padding, children.
-    static QByteArray node(
-        const QString& key, const QByteArray& value, quint16 type, quint16 valueLength, const QByteArray& children = {})
-    {
-        QByteArray out(6, '\0');
-        out.append(reinterpret_cast<const char*>(key.utf16()), key.size() * 2).append(2, '\0');
-        while (out.size() % 4)
-            out.append('\0');
-        out.append(value);
-        while (out.size() % 4)
-            out.append('\0');
-        out.append(children);
-        const quint16 length = quint16(out.size());
-        out[0] = char(length & 0xFF);
-        out[1] = char(length >> 8);
-        out[2] = char(valueLength & 0xFF);
-        out[3] = char(valueLength >> 8);
-        out[4] = char(type);
-        return out;
-    }
-
-    static QByteArray text(const QString& value)
-    {
-        return QByteArray(reinterpret_cast<const char*>(value.utf16()), value.size() * 2).append(2, '\0');
-    }
 
 private Q_SLOTS:
     void fixtures_data()
@@ -58,131 +73,89 @@ private Q_SLOTS:
                                     << QStringList {u"Fixture Works"_s, u"Marble Cascade"_s, u"1.2.3.4"_s, u"marble"_s,
                                            u"(c) Fixture Works"_s, u"marble.exe"_s, u"Marble Cascade Deluxe"_s,
                                            u"1.2"_s};
-        QTest::newRow("Russian, code page 1251") << "ver_ru32.exe"
-                                                 << "041904E3"
-                                                 << QStringList {u"Студия Пример"_s, u"Весёлые шарики"_s, u"2.0.0.1"_s,
-                                                        u""_s, u""_s, u""_s, u"Шарики"_s, u""_s};
+        QTest::newRow("Russian, code page 1251")
+            << "ver_ru32.exe"
+            << "041904E3"
+            << QStringList {u"Студия Пример"_s, u"Весёлые шарики"_s, u"2.0.0.1"_s, {}, {}, {}, u"Шарики"_s, {}};
         QTest::newRow("no description") << "ver_nodesc64.exe"
                                         << "040904E4"
-                                        << QStringList {u"Nameless Games"_s, u""_s, u"3.1"_s, u"nodesc"_s, u""_s,
+                                        << QStringList {u"Nameless Games"_s, {}, u"3.1"_s, u"nodesc"_s, {},
                                                u"nodesc.exe"_s, u"No Description"_s, u"3.1"_s};
     }
 
     void fixtures()
     {
-        if (!IconTest::fixturesBuilt())
-            QSKIP("PE fixtures were not built");
         QFETCH(QString, file);
         QFETCH(QString, translation);
         QFETCH(QStringList, expected);
-        const QString path = IconTest::peFixture(file);
+        const QString path = PeFixture(file);
         clsFileVersion version;
         QVERIFY(version.ReadVersion(path));
         QCOMPARE(fields(version), expected);
         QCOMPARE(version.FullFileName(), path);
         QCOMPARE(ReadVersionStrings(path)->translation, translation);
+    }
 
-        const auto reference = IconTest::pefileReading(path);
-        if (!reference)
-            QSKIP("python3-pefile is not installed");
-        const QJsonObject pefileVersion = reference->value(QStringLiteral("version")).toObject();
-        QCOMPARE(pefileVersion.value(QStringLiteral("translation")).toString(), translation);
-        const QJsonObject pefileFields = pefileVersion.value(QStringLiteral("fields")).toObject();
-        for (qsizetype i = 0; i < VersionFieldNames().size(); ++i)
-            QCOMPARE(fields(version).at(i), pefileFields.value(VersionFieldNames().at(i)).toString());
+    void getAllHasItsOwnOrder()
+    {
+        clsFileVersion version;
+        QVERIFY(version.ReadVersion(PeFixture(u"multi32.exe"_s)));
+        QCOMPARE(version.GetAll(),
+            u"Marble Cascade Deluxe; 1.2; marble; Marble Cascade; 1.2.3.4; Fixture Works; (c) Fixture Works; marble.exe"_s);
     }
 
     void nothingToRead_data()
     {
         QTest::addColumn<QString>("path");
-        QTest::newRow("no resources") << IconTest::peFixture(QStringLiteral("nores32.exe"));
-        QTest::newRow("icons only") << IconTest::peFixture(QStringLiteral("twogroups64.exe"));
-        QTest::newRow("missing file") << m_env.path(QStringLiteral("none.exe"));
-        QTest::newRow("not an executable") << QStringLiteral(BRIMVAULT_SOURCE_DIR "/tests/icons/CMakeLists.txt");
+        QTest::newRow("no resources") << PeFixture(u"nores32.exe"_s);
+        QTest::newRow("icons only") << PeFixture(u"twogroups64.exe"_s);
+        QTest::newRow("missing file") << m_env.path(u"none.exe"_s);
+        QTest::newRow("not an executable") << IconInput(u"main.ico"_s);
     }
 
     void nothingToRead()
     {
         QFETCH(QString, path);
         clsFileVersion version;
-        if (IconTest::fixturesBuilt())
-            QVERIFY(version.ReadVersion(IconTest::peFixture(QStringLiteral("multi32.exe"))));
+        QVERIFY(version.ReadVersion(PeFixture(u"multi32.exe"_s)));
         QVERIFY(!version.ReadVersion(path));
         QCOMPARE(fields(version), QStringList(8, QString()));
-        QCOMPARE(version.GetAll(), QStringLiteral("; ; ; ; ; ; ; "));
-    }
-
-    void getAllHasItsOwnOrder()
-    {
-        if (!IconTest::fixturesBuilt())
-            QSKIP("PE fixtures were not built");
-        clsFileVersion version;
-        QVERIFY(version.ReadVersion(IconTest::peFixture(QStringLiteral("multi32.exe"))));
-        QCOMPARE(version.GetAll(),
-            QStringLiteral("Marble Cascade Deluxe; 1.2; marble; Marble Cascade; 1.2.3.4; Fixture Works; "
-                           "(c) Fixture Works; marble.exe"));
+        QCOMPARE(version.GetAll(), u"; ; ; ; ; ; ; "_s);
     }
 
     void blockQueries_data()
     {
         QTest::addColumn<QByteArray>("block");
-        QTest::addColumn<QString>("translation");
         QTest::addColumn<QString>("company");
-
-        const QByteArray translation = node(QStringLiteral("Translation"), QByteArray("\x19\x04\xe3\x04", 4), 0, 4);
-        const QByteArray vars = node(QStringLiteral("VarFileInfo"), {}, 1, 0, translation);
-        const auto strings = [](const QString& table, const QByteArray& value, quint16 valueLength) {
-            const QByteArray company = node(QStringLiteral("CompanyName"), value, 1, valueLength);
-            return node(QStringLiteral("StringFileInfo"), {}, 1, 0, node(table, {}, 1, 0, company));
-        };
-        const QByteArray fixed(52, '\0');
-        const QByteArray acme = text(QStringLiteral("Acme"));
-        QTest::newRow("plain") << node(
-            QStringLiteral("VS_VERSION_INFO"), fixed, 0, 52, strings(QStringLiteral("041904E3"), acme, 5) + vars)
-                               << "041904E3"
-                               << "Acme";
-        QTest::newRow("keys in other case") << node(
-            QStringLiteral("VS_VERSION_INFO"), fixed, 0, 52, strings(QStringLiteral("041904e3"), acme, 5) + vars)
-                                            << "041904E3"
-                                            << "Acme";
-        QTest::newRow("length in bytes") << node(
-            QStringLiteral("VS_VERSION_INFO"), fixed, 0, 52, strings(QStringLiteral("041904E3"), acme, 10) + vars)
-                                         << "041904E3"
-                                         << "Acme";
-        QTest::newRow("text with a NUL inside") << node(QStringLiteral("VS_VERSION_INFO"), fixed, 0, 52,
-            strings(QStringLiteral("041904E3"), text(QStringLiteral("Ac")) + text(QStringLiteral("me")), 6) + vars)
-                                                << "041904E3"
-                                                << "Ac";
-        QTest::newRow("table under another name") << node(
-            QStringLiteral("VS_VERSION_INFO"), fixed, 0, 52, strings(QStringLiteral("040904B0"), acme, 5) + vars)
-                                                  << "041904E3"
-                                                  << "";
+        const QByteArray acme = text(u"Acme"_s);
+        QTest::newRow("plain") << versionBlock(u"041904E3"_s, acme, 5) << "Acme";
+        QTest::newRow("keys in other case") << versionBlock(u"041904e3"_s, acme, 5) << "Acme";
+        QTest::newRow("length in bytes") << versionBlock(u"041904E3"_s, acme, 10) << "Acme";
+        QTest::newRow("text with a NUL inside")
+            << versionBlock(u"041904E3"_s, text(u"Ac"_s) + text(u"me"_s), 6) << "Ac";
+        QTest::newRow("table under another name") << versionBlock(u"040904B0"_s, acme, 5) << "";
     }
 
     void blockQueries()
     {
         QFETCH(QByteArray, block);
-        QFETCH(QString, translation);
         QFETCH(QString, company);
         const auto strings = ReadVersionStrings(VersionResource(block));
         QVERIFY(strings);
-        QCOMPARE(strings->translation, translation);
+        QCOMPARE(strings->translation, u"041904E3"_s);
         QCOMPARE(strings->values.at(0), company);
     }
 
     void brokenBlocksReadNothing_data()
     {
         QTest::addColumn<QByteArray>("block");
-        const QByteArray vars = node(QStringLiteral("VarFileInfo"), {}, 1, 0,
-            node(QStringLiteral("Translation"), QByteArray("\x09\x04", 2), 0, 2));
+        const QByteArray vars
+            = node(u"VarFileInfo"_s, {}, 1, 0, node(u"Translation"_s, QByteArray("\x09\x04", 2), 0, 2));
+        QByteArray tooLong = node(u"VS_VERSION_INFO"_s, {}, 0, 0, vars);
+        tooLong.replace(0, 2, "\xff\xff");
         QTest::newRow("empty") << QByteArray();
-        QTest::newRow("short translation")
-            << node(QStringLiteral("VS_VERSION_INFO"), QByteArray(52, '\0'), 0, 52, vars);
-        QByteArray zeroLength = node(QStringLiteral("VS_VERSION_INFO"), {}, 0, 0, QByteArray(64, '\0'));
-        QTest::newRow("children of length 0") << zeroLength;
-        QByteArray tooLong = node(QStringLiteral("VS_VERSION_INFO"), {}, 0, 0, vars);
-        tooLong[0] = char(0xFF);
-        tooLong[1] = char(0xFF);
+        QTest::newRow("short translation") << node(u"VS_VERSION_INFO"_s, QByteArray(52, '\0'), 0, 52, vars);
+        QTest::newRow("children of length 0") << node(u"VS_VERSION_INFO"_s, {}, 0, 0, QByteArray(64, '\0'));
         QTest::newRow("length past the end") << tooLong;
     }
 
@@ -191,7 +164,44 @@ private Q_SLOTS:
         QFETCH(QByteArray, block);
         QVERIFY(!ReadVersionStrings(VersionResource(block)));
     }
+
+    void versionInfoCommand()
+    {
+        QString out;
+        QString err;
+        QTextStream outStream(&out);
+        QTextStream errStream(&err);
+        QCOMPARE(IconCommands::PrintVersionInfo(PeFixture(u"ver_nodesc64.exe"_s), outStream, errStream), 0);
+        QCOMPARE(out,
+            u"Translation=040904E4\nCompanyName=Nameless Games\nFileDescription=\nFileVersion=3.1\n"
+            "InternalName=nodesc\nLegalCopyright=\nOriginalFileName=nodesc.exe\nProductName=No Description\n"
+            "ProductVersion=3.1\n"_s);
+        QCOMPARE(IconCommands::PrintVersionInfo(PeFixture(u"nores64.exe"_s), outStream, errStream), 1);
+        QCOMPARE(err, PeFixture(u"nores64.exe"_s) + u": no version information could be read\n"_s);
+    }
+
+    // Both commands through the real program: standard output, the icon file, and a one-line reason.
+    void theProgramRunsBothCommands()
+    {
+        QProcess process;
+        QProcessEnvironment environment = QProcessEnvironment::systemEnvironment();
+        environment.insert(u"XDG_RUNTIME_DIR"_s, m_env.root()); // else Qt's start-up note shares standard error
+        process.setProcessEnvironment(environment);
+        const auto run = [&process](const QStringList& arguments) {
+            process.start(ProgramPath(), arguments);
+            return process.waitForFinished(60000) ? process.exitCode() : -1;
+        };
+        QCOMPARE(run({u"--version-info"_s, PeFixture(u"ver_ru32.exe"_s)}), 0);
+        QVERIFY(process.readAllStandardOutput().startsWith(
+            u"Translation=041904E3\nCompanyName=Студия Пример\nFileDescription=Весёлые шарики\n"_s.toUtf8()));
+        const QString ico = m_env.path(u"program.ico"_s);
+        QCOMPARE(run({u"--extract-icon"_s, PeFixture(u"multi64.exe"_s), ico}), 0);
+        QCOMPARE(ReadFile(ico), ReadFile(IconInput(u"main.ico"_s)));
+        QCOMPARE(run({u"--extract-icon"_s, PeFixture(u"nores64.exe"_s), ico}), 1);
+        QCOMPARE(QString::fromUtf8(process.readAllStandardError()),
+            PeFixture(u"nores64.exe"_s) + u": the file has no resources\n"_s);
+    }
 };
 
-QTEST_GUILESS_MAIN(TestFileVersion)
+BV_REGISTER_TEST(TestFileVersion);
 #include "tst_clsfileversion.moc"

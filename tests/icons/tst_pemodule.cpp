@@ -1,9 +1,9 @@
 #include "TestEnvironment.h"
+#include "TestFiles.h"
+#include "TestSuite.h"
 #include "icons/PeModule.h"
 #include "icons/cFileIcon.h"
 
-#include <QFile>
-#include <QTest>
 #include <QtEndian>
 
 using namespace Brimvault;
@@ -11,116 +11,78 @@ using namespace Brimvault;
 namespace {
 
 constexpr quint32 RsrcRva = 0x1000;
+constexpr quint32 Subdirectory = 0x80000000u;
 
-void put8(QByteArray& bytes, qint64 at, quint8 value)
+template <typename T>
+void put(QByteArray& bytes, qint64 at, T value)
 {
-    if (bytes.size() < at + 1)
-        bytes.resize(at + 1, '\0');
-    bytes[at] = char(value);
+    if (bytes.size() < at + qint64(sizeof(T)))
+        bytes.resize(at + qint64(sizeof(T)), '\0');
+    qToLittleEndian<T>(value, bytes.data() + at);
 }
 
-void put16(QByteArray& bytes, qint64 at, quint16 value)
-{
-    if (bytes.size() < at + 2)
-        bytes.resize(at + 2, '\0');
-    qToLittleEndian(value, bytes.data() + at);
-}
-
-void put32(QByteArray& bytes, qint64 at, quint32 value)
-{
-    if (bytes.size() < at + 4)
-        bytes.resize(at + 4, '\0');
-    qToLittleEndian(value, bytes.data() + at);
-}
-
-// A resource directory header at `at` followed by its entries: (name or id, target) pairs, written as given.
+// A resource directory at `at`: its counts, then the (name or id, target) pairs as given.
 void putDirectory(
-    QByteArray& rsrc, qint64 at, quint16 named, quint16 ids, const QList<QPair<quint32, quint32>>& entries)
+    QByteArray& rsrc, qint64 at, quint16 named, quint16 ids, const QList<std::pair<quint32, quint32>>& entries)
 {
-    put16(rsrc, at + 12, named);
-    put16(rsrc, at + 14, ids);
+    put<quint16>(rsrc, at + 12, named);
+    put<quint16>(rsrc, at + 14, ids);
     for (qsizetype i = 0; i < entries.size(); ++i) {
-        put32(rsrc, at + 16 + 8 * i, entries.at(i).first);
-        put32(rsrc, at + 16 + 8 * i + 4, entries.at(i).second);
+        put<quint32>(rsrc, at + 16 + 8 * i, entries.at(i).first);
+        put<quint32>(rsrc, at + 20 + 8 * i, entries.at(i).second);
     }
-}
-
-void putDataEntry(QByteArray& rsrc, qint64 at, quint32 rva, quint32 size)
-{
-    put32(rsrc, at, rva);
-    put32(rsrc, at + 4, size);
 }
 
 void putName(QByteArray& rsrc, qint64 at, const QString& name)
 {
-    put16(rsrc, at, quint16(name.size()));
+    put<quint16>(rsrc, at, quint16(name.size()));
     for (qsizetype i = 0; i < name.size(); ++i)
-        put16(rsrc, at + 2 + 2 * i, name.at(i).unicode());
+        put<quint16>(rsrc, at + 2 + 2 * i, name.at(i).unicode());
 }
 
 // A 32-bit PE image whose only section holds `rsrc` at the given file offset.
 QByteArray peWith(const QByteArray& rsrc, quint32 rawPointer = 0x200, quint32 rawSize = 0)
 {
-    if (rawSize == 0)
-        rawSize = quint32(rsrc.size());
-    QByteArray pe(rawPointer, '\0');
-    pe[0] = 'M';
-    pe[1] = 'Z';
-    put32(pe, 0x3C, 0x40);
+    rawSize = rawSize ? rawSize : quint32(rsrc.size());
+    QByteArray pe = QByteArray("MZ").leftJustified(rawPointer, '\0');
+    put<quint32>(pe, 0x3C, 0x40);
     pe.replace(0x40, 4, QByteArray("PE\0\0", 4));
-    put16(pe, 0x44, 0x14C);
-    put16(pe, 0x46, 1); // sections
-    put16(pe, 0x54, 224); // optional header size
-    const qint64 optional = 0x58;
-    put16(pe, optional, 0x10B);
-    put32(pe, optional + 60, rawPointer); // size of headers
-    put32(pe, optional + 92, 16);
-    put32(pe, optional + 96 + 2 * 8, RsrcRva);
-    put32(pe, optional + 96 + 2 * 8 + 4, quint32(rsrc.size()));
-    const qint64 section = optional + 224;
+    put<quint16>(pe, 0x44, 0x14C);
+    put<quint16>(pe, 0x46, 1); // sections
+    put<quint16>(pe, 0x54, 224); // optional header size
+    put<quint16>(pe, 0x58, 0x10B);
+    put<quint32>(pe, 0x58 + 60, rawPointer); // size of headers
+    put<quint32>(pe, 0x58 + 92, 16);
+    put<quint32>(pe, 0x58 + 112, RsrcRva);
+    put<quint32>(pe, 0x58 + 116, quint32(rsrc.size()));
+    const qint64 section = 0x58 + 224;
     pe.replace(section, 6, QByteArray(".rsrc\0", 6));
-    put32(pe, section + 8, quint32(qMax<qsizetype>(rsrc.size(), rawSize)));
-    put32(pe, section + 12, RsrcRva);
-    put32(pe, section + 16, rawSize);
-    put32(pe, section + 20, rawPointer);
-    pe.resize(rawPointer, '\0');
+    put<quint32>(pe, section + 8, quint32(qMax<qsizetype>(rsrc.size(), rawSize)));
+    put<quint32>(pe, section + 12, RsrcRva);
+    put<quint32>(pe, section + 16, rawSize);
+    put<quint32>(pe, section + 20, rawPointer);
     return pe + rsrc.left(rawSize);
 }
 
-// Types 14 then 3 (a one-image group "#1" with image 1), the image bytes last: a minimal, valid tree.
+// Types 3 and 14: a one-image group 1 (1 × 1, 1-bit, 48 bytes) and its image 1, which lies `padding` further on.
 QByteArray validIconTree(qint64 padding = 0)
 {
     QByteArray rsrc;
-    putDirectory(rsrc, 0, 0, 2, {{3, 0x80000000u | 0x30}, {14, 0x80000000u | 0x60}});
-    putDirectory(rsrc, 0x30, 0, 1, {{1, 0x80000000u | 0x48}});
+    putDirectory(rsrc, 0, 0, 2, {{3, Subdirectory | 0x30}, {14, Subdirectory | 0x60}});
+    putDirectory(rsrc, 0x30, 0, 1, {{1, Subdirectory | 0x48}});
     putDirectory(rsrc, 0x48, 0, 1, {{0x409, 0xC0}});
-    putDirectory(rsrc, 0x60, 0, 1, {{1, 0x80000000u | 0x78}});
+    putDirectory(rsrc, 0x60, 0, 1, {{1, Subdirectory | 0x78}});
     putDirectory(rsrc, 0x78, 0, 1, {{0x409, 0xD0}});
     const qint64 image = 0x100 + padding;
-    putDataEntry(rsrc, 0xC0, quint32(RsrcRva + image), 48);
-    putDataEntry(rsrc, 0xD0, RsrcRva + 0xE0, 20);
-    // group: 0, 1, 1 image; entry 1 × 1, 2 colours, planes 1, 1 bit, 48 bytes, id 1
-    put16(rsrc, 0xE0 + 2, 1);
-    put16(rsrc, 0xE0 + 4, 1);
-    put8(rsrc, 0xE6, 1);
-    put8(rsrc, 0xE7, 1);
-    put8(rsrc, 0xE8, 2);
-    put16(rsrc, 0xEA, 1);
-    put16(rsrc, 0xEC, 1);
-    put32(rsrc, 0xEE, 48);
-    put16(rsrc, 0xF2, 1);
-    put32(rsrc, image, 40);
-    put32(rsrc, image + 4, 1);
-    put32(rsrc, image + 8, 2);
-    put16(rsrc, image + 12, 1);
-    put16(rsrc, image + 14, 1);
-    rsrc.resize(image + 48, '\0');
+    put<quint32>(rsrc, 0xC0, quint32(RsrcRva + image));
+    put<quint32>(rsrc, 0xC4, 48);
+    put<quint32>(rsrc, 0xD0, RsrcRva + 0xE0);
+    put<quint32>(rsrc, 0xD4, 20);
+    rsrc.resize(0xE0, '\0');
+    rsrc += QByteArray::fromHex("0000 0100 0100 01010200 0100 0100 30000000 0100"); // the group, at 0xE0
+    rsrc.resize(image, '\0');
+    rsrc += QByteArray::fromHex("28000000 01000000 02000000 0100 0100") + QByteArray(32, '\0');
     return rsrc;
-}
-
-QString keyText(const ResourceKey& key)
-{
-    return key.named ? key.name : QString::number(key.id);
 }
 
 } // namespace
@@ -131,20 +93,17 @@ class TestPeModule : public QObject {
 private:
     TestEnvironment m_env;
 
-    QString write(const QByteArray& bytes)
+    QString written(const QByteArray& bytes)
     {
         const QString path = m_env.path(QStringLiteral("crafted.exe"));
-        QFile file(path);
-        if (!file.open(QIODevice::WriteOnly | QIODevice::Truncate) || file.write(bytes) != bytes.size())
-            qFatal("cannot write");
-        return path;
+        return WriteFile(path, bytes) ? path : QString();
     }
 
 private Q_SLOTS:
     void validTreeLoads()
     {
         cFileIcon icon;
-        QVERIFY(icon.LoadMainIconFromEXE(write(peWith(validIconTree()))));
+        QVERIFY(icon.LoadMainIconFromEXE(written(peWith(validIconTree()))));
         QCOMPARE(icon.ResourceID(), QVariant(1));
         QCOMPARE(icon.ImageSize(1), 48);
     }
@@ -153,14 +112,14 @@ private Q_SLOTS:
     {
         QByteArray rsrc;
         putDirectory(rsrc, 0, 1, 2,
-            {{9, 0x80000000u | 0x40}, {0x80000000u | 0x30, 0x80000000u | 0x40}, {4, 0x80000000u | 0x40}});
+            {{9, Subdirectory | 0x40}, {Subdirectory | 0x30, Subdirectory | 0x40}, {4, Subdirectory | 0x40}});
         putName(rsrc, 0x30, QStringLiteral("Zed"));
         putDirectory(rsrc, 0x40, 0, 0, {});
         const auto module = PeModule::fromBytes(peWith(rsrc)).module;
         QVERIFY(module);
         QStringList types;
         for (const ResourceKey& key : module->resourceTypes())
-            types.append(keyText(key));
+            types.append(key.named ? key.name : QString::number(key.id));
         QCOMPARE(types, QStringList({QStringLiteral("Zed"), QStringLiteral("9"), QStringLiteral("4")}));
     }
 
@@ -168,37 +127,31 @@ private Q_SLOTS:
     {
         QTest::addColumn<QByteArray>("pe");
         QTest::addColumn<int>("types");
-
         QByteArray selfLoop;
-        putDirectory(selfLoop, 0, 0, 1, {{14, 0x80000000u}});
+        putDirectory(selfLoop, 0, 0, 1, {{14, Subdirectory}});
         QTest::newRow("directory pointing at itself") << peWith(selfLoop) << 1;
-
         QByteArray hugeCount;
-        putDirectory(hugeCount, 0, 0xFFFF, 0xFFFF, {{14, 0x80000000u | 0x20}});
+        putDirectory(hugeCount, 0, 0xFFFF, 0xFFFF, {{14, Subdirectory | 0x20}});
         QTest::newRow("counts past the end") << peWith(hugeCount) << 1;
-
         QByteArray outside = validIconTree();
-        putDataEntry(outside, 0xC0, 0x7FFF0000u, 48);
+        put<quint32>(outside, 0xC0, 0x7FFF0000u);
         QTest::newRow("image data outside every section") << peWith(outside) << 2;
-
         QByteArray overflow = validIconTree();
-        putDataEntry(overflow, 0xC0, 0xFFFFFFF0u, 0x100);
+        put<quint32>(overflow, 0xC0, 0xFFFFFFF0u);
+        put<quint32>(overflow, 0xC4, 0x100);
         QTest::newRow("data range wrapping around") << peWith(overflow) << 2;
-
         QTest::newRow("image in the zero-filled tail") << peWith(validIconTree(), 0x200, 0x100) << 2;
-
         // Every type points at the same long run of entries, shifted by one entry each time.
         QByteArray overlapping;
-        QList<QPair<quint32, quint32>> entries;
+        QList<std::pair<quint32, quint32>> entries;
         for (quint32 i = 0; i < 2000; ++i)
-            entries.append({i + 1, 0x80000000u | (16 + 8 * i)});
+            entries.append({i + 1, Subdirectory | (16 + 8 * i)});
         putDirectory(overlapping, 0, 0, 2000, entries);
         QTest::newRow("overlapping directories") << peWith(overlapping) << 2000;
-
         QByteArray longName;
-        putDirectory(longName, 0, 1, 0, {{0x80000000u | 0x20, 0x80000000u | 0x18}});
-        putName(longName, 0x20, QString(0xFFFF, u'A').left(0x7FF0));
-        put16(longName, 0x20, 0xFFFF);
+        putDirectory(longName, 0, 1, 0, {{Subdirectory | 0x20, Subdirectory | 0x18}});
+        putName(longName, 0x20, QString(0x7FF0, u'A'));
+        put<quint16>(longName, 0x20, 0xFFFF);
         QTest::newRow("name longer than the file") << peWith(longName) << 1;
     }
 
@@ -212,23 +165,20 @@ private Q_SLOTS:
         QCOMPARE(found.size(), types);
         for (const ResourceKey& key : found)
             QVERIFY(key.name.size() <= 512);
-        // A full walk never lists more leaves than the file has room for.
-        QVERIFY(module->allResources().size() <= pe.size() / 16);
+        QVERIFY(module->allResources().size() <= pe.size() / 16); // never more leaves than the file has room for
         cFileIcon icon;
-        QVERIFY(!icon.LoadMainIconFromEXE(write(pe)));
+        QVERIFY(!icon.LoadMainIconFromEXE(written(pe)));
         QCOMPARE(icon.ImageCount(), 0);
     }
 
     void fileShrinkingUnderTheReader()
     {
         // The icon lies 64 KiB in, past what opening the file reads.
-        const QByteArray pe = peWith(validIconTree(0x10000));
-        const QString path = write(pe);
+        const QString path = written(peWith(validIconTree(0x10000)));
         const auto module = PeModule::open(path).module;
         QVERIFY(module);
         QFile::resize(path, 0x8000);
-        const auto group = module->findResource(ResourceKey::fromId(14), ResourceKey::fromId(1));
-        QVERIFY(group);
+        QVERIFY(module->findResource(ResourceKey::fromId(14), ResourceKey::fromId(1)));
         const auto image = module->findResource(ResourceKey::fromId(3), ResourceKey::fromId(1));
         QVERIFY(image);
         QCOMPARE(image->size, 48u);
@@ -238,20 +188,16 @@ private Q_SLOTS:
     void notExecutables_data()
     {
         QTest::addColumn<QByteArray>("bytes");
-        QByteArray noSignature = peWith(validIconTree());
-        noSignature[0x41] = 'X';
-        QByteArray badMagic = peWith(validIconTree());
-        put16(badMagic, 0x58, 0x107);
-        QByteArray farHeader = peWith(validIconTree());
-        put32(farHeader, 0x3C, 0xFFFFFFF0u);
-        QByteArray manySections = peWith(validIconTree());
-        put16(manySections, 0x46, 0xFFFF);
+        const QByteArray valid = peWith(validIconTree());
+        const auto changed = [&valid](qint64 at, const QByteArray& bytes) {
+            QByteArray out = valid;
+            return out.replace(at, bytes.size(), bytes);
+        };
         QTest::newRow("empty") << QByteArray();
-        QTest::newRow("MZ only") << QByteArray("MZ");
-        QTest::newRow("no PE signature") << noSignature;
-        QTest::newRow("unknown optional header") << badMagic;
-        QTest::newRow("header offset past the end") << farHeader;
-        QTest::newRow("section table past the end") << manySections;
+        QTest::newRow("no PE signature") << changed(0x41, "X");
+        QTest::newRow("unknown optional header") << changed(0x58, QByteArray("\x07\x01", 2));
+        QTest::newRow("header offset past the end") << changed(0x3C, "\xf0\xff\xff\xff");
+        QTest::newRow("section table past the end") << changed(0x46, "\xff\xff");
     }
 
     void notExecutables()
@@ -263,5 +209,5 @@ private Q_SLOTS:
     }
 };
 
-QTEST_GUILESS_MAIN(TestPeModule)
+BV_REGISTER_TEST(TestPeModule);
 #include "tst_pemodule.moc"

@@ -1,5 +1,5 @@
+#include "MovieFiles.h"
 #include "RuffleFixture.h"
-#include "SwfBuilder.h"
 #include "TestEnvironment.h"
 #include "TestFiles.h"
 

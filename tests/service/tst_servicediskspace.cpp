@@ -2,15 +2,16 @@
 #include "store/DataFolders.h"
 #include "store/SettingsStore.h"
 
-#include "ServiceTestSupport.h"
+#include "ProgramRun.h"
 #include "SmallFileSystem.h"
 #include "TestEnvironment.h"
+#include "TestFiles.h"
+#include "TestSuite.h"
 
 #include <QProcess>
 #include <QtTest>
 
 using namespace Brimvault;
-using namespace ServiceTestSupport;
 
 // The real service installing into a games folder on a small file system of its own.
 class TestServiceDiskSpace : public QObject {
@@ -46,37 +47,36 @@ void TestServiceDiskSpace::packageLargerThanTheDisk()
     TestEnvironment environment;
     const QString source = environment.path(QStringLiteral("source/Big Game"));
     for (int i = 0; i < files; ++i)
-        QVERIFY(writeFile(source + QStringLiteral("/part%1.exe").arg(i), randomBytes(fileSize, quint32(i))));
+        QVERIFY(WriteFile(source + QStringLiteral("/part%1.exe").arg(i), RandomBytes(fileSize, quint32(i))));
     const QString package = environment.path(QStringLiteral("big.bvxpak"));
-    QCOMPARE(runService({QStringLiteral("--pack"), source, package}).exitCode, 0);
+    QCOMPARE(RunService({QStringLiteral("--pack"), source, package}, nullptr), 0);
 
     SmallFileSystem disk(environment.path(QStringLiteral("commonappdata")), options);
     QVERIFY2(disk.isMounted(), qPrintable(disk.error()));
     const QString games = DataFolders::GamesFolder();
-    QVERIFY(writeFile(games + QStringLiteral("Existing/Existing.exe"), "MZ existing"));
+    QVERIFY(WriteFile(games + QStringLiteral("Existing/Existing.exe"), "MZ existing"));
     QVERIFY(SaveSetting(
         AppTitle(), CatalogueKeys::CommandsSection, CatalogueKeys::NewGameInstalledKey, QStringLiteral("0")));
-    const QStringList before = treeListing(games);
+    const auto before = SnapshotTree(games);
 
     QProcess service;
-    if (hideMountTable) {
-        service.setProgram(QStringLiteral("unshare"));
-        service.setArguments({QStringLiteral("--mount"), QStringLiteral("--propagation"), QStringLiteral("private"),
-            QStringLiteral("sh"), QStringLiteral("-c"),
-            QStringLiteral("mount -t tmpfs none /proc && exec \"$0\" \"$@\""), servicePath(), QStringLiteral("-I"),
-            package});
-        service.start();
-    } else {
-        startService(service, {QStringLiteral("-I"), package});
-    }
+    const QStringList install {QStringLiteral("-I"), package};
+    if (hideMountTable)
+        service.start(QStringLiteral("unshare"),
+            QStringList {QStringLiteral("--mount"), QStringLiteral("--propagation"), QStringLiteral("private"),
+                QStringLiteral("sh"), QStringLiteral("-c"),
+                QStringLiteral("mount -t tmpfs none /proc && exec \"$0\" \"$@\""), ServicePath()}
+                + install);
+    else
+        service.start(ServicePath(), install);
     QVERIFY(service.waitForFinished(120000));
     const QString errors = QString::fromLocal8Bit(service.readAllStandardError());
     QCOMPARE(service.exitCode(), 1);
     QVERIFY2(errors.contains(QStringLiteral("not enough free space")) && errors.contains(reason), qPrintable(errors));
-    QCOMPARE(treeListing(games), before);
+    QVERIFY(SnapshotTree(games) == before);
     QCOMPARE(GetSetting(AppTitle(), CatalogueKeys::CommandsSection, CatalogueKeys::NewGameInstalledKey),
         QStringLiteral("0"));
 }
 
-QTEST_GUILESS_MAIN(TestServiceDiskSpace)
+BV_REGISTER_TEST(TestServiceDiskSpace);
 #include "tst_servicediskspace.moc"

@@ -12,20 +12,28 @@
 #include <QTest>
 
 using namespace Brimvault;
+using namespace Qt::StringLiterals;
 
 namespace {
 
-// A model of count elements with the given caption heights (cycled), as the list would hold them.
-ListModel modelWithCaptions(int count, const QList<int>& heights)
-{
+// count elements with the given caption heights (cycled), as the list would hold them, arranged for a usable
+// width (a negative width leaves them unarranged).
+struct Grid {
     ListModel model;
-    for (int i = 0; i < count; ++i) {
-        ListItem& item = i == 0 ? model.at(0) : model.load();
-        item.captionHeight = heights.at(i % heights.size());
-        item.iconVisible = item.captionVisible = true;
+    ListLayoutState state;
+    SelectionFrame frame;
+
+    Grid(int count, const QList<int>& heights, double usableWidth)
+    {
+        for (int i = 0; i < count; ++i) {
+            ListItem& item = i == 0 ? model.at(0) : model.load();
+            item.captionHeight = heights.at(i % heights.size());
+            item.iconVisible = item.captionVisible = true;
+        }
+        if (usableWidth >= 0)
+            GridLayout::arrangeAll(model, state, frame, usableWidth);
     }
-    return model;
-}
+};
 
 } // namespace
 
@@ -33,15 +41,13 @@ class TestListLayout : public QObject {
     Q_OBJECT
 
 private Q_SLOTS:
-    void initTestCase() { m_font = QFont(QStringLiteral("DejaVu Sans"), 9); }
+    void initTestCase() { m_font = QFont(u"DejaVu Sans"_s, 9); }
 
     void roundedIntDiv_data()
     {
         QTest::addColumn<double>("dividend");
         QTest::addColumn<double>("divisor");
         QTest::addColumn<long long>("quotient");
-        QTest::newRow("icon offset") << 48.0 << 2.0 << 24LL;
-        QTest::newRow("caption offset") << 16.0 << 2.0 << 8LL;
         QTest::newRow("half rounds to even down") << 2.5 << 1.0 << 2LL;
         QTest::newRow("half rounds to even up") << 3.5 << 1.0 << 4LL;
         QTest::newRow("truncates towards zero") << -7.0 << 2.0 << -3LL;
@@ -58,12 +64,10 @@ private Q_SLOTS:
     void captionLinesFitAndAreGreedy_data()
     {
         QTest::addColumn<QString>("caption");
-        QTest::newRow("one word") << QStringLiteral("Chess");
-        QTest::newRow("three words") << QStringLiteral("Solitaire Collection Deluxe");
-        QTest::newRow("long word") << QStringLiteral("Supercalifragilisticexpialidocious");
-        QTest::newRow("blanks between") << QStringLiteral("Mah   Jongg  Quest of the Dragon");
-        QTest::newRow("cyrillic") << QStringLiteral("Косынка и другие пасьянсы");
-        QTest::newRow("inserted blanks") << QStringLiteral("Superlongnam egamewithoutb lanks...");
+        QTest::newRow("three words") << u"Solitaire Collection Deluxe"_s;
+        QTest::newRow("long word") << u"Supercalifragilisticexpialidocious"_s;
+        QTest::newRow("blanks between") << u"Mah   Jongg  Quest of the Dragon"_s;
+        QTest::newRow("cyrillic") << u"Косынка и другие пасьянсы"_s;
         QTest::newRow("emoji word") << QString::fromUtf8("\xF0\x9F\x8E\xAE\xF0\x9F\x8E\xB2\xF0\x9F\x8E\xAF"
                                                          "\xF0\x9F\x8E\xAE\xF0\x9F\x8E\xB2\xF0\x9F\x8E\xAF "
                                                          "Party");
@@ -105,12 +109,12 @@ private Q_SLOTS:
     void captionHardBreaksAndEmptyText()
     {
         CaptionWrapper wrapper(m_font);
-        QCOMPARE(wrapper.lineCount(QStringLiteral("A\nB"), 64), 2);
-        QCOMPARE(wrapper.lineCount(QStringLiteral("A\r\nB"), 64), 2);
+        QCOMPARE(wrapper.lineCount(u"A\nB"_s, 64), 2);
+        QCOMPARE(wrapper.lineCount(u"A\r\nB"_s, 64), 2);
         QCOMPARE(wrapper.height(QString(), 64), wrapper.lineSpacing());
-        QCOMPARE(wrapper.lineCount(QStringLiteral("   "), 64), 1);
+        QCOMPARE(wrapper.lineCount(u"   "_s, 64), 1);
         // A word of wide letters is broken between letters rather than running out of the caption.
-        QVERIFY(wrapper.lineCount(QStringLiteral("WWWWWWWWWWWWWWWW"), 64) >= 2);
+        QVERIFY(wrapper.lineCount(u"WWWWWWWWWWWWWWWW"_s, 64) >= 2);
         // A word too wide for the line breaks after its hyphen rather than inside one of its parts.
         const QString online = QString::fromUtf8("Онлайн-игры");
         QVERIFY(QFontMetricsF(m_font).horizontalAdvance(online) > 64);
@@ -122,69 +126,53 @@ private Q_SLOTS:
 
     void arrangeThreeCellsInUsableWidth283()
     {
-        ListModel model = modelWithCaptions(7, {28, 42, 14});
-        ListLayoutState state;
-        SelectionFrame frame;
-        GridLayout::arrangeAll(model, state, frame, 283);
-        const QList<float> lefts {24, 104, 184, 24, 104, 184, 24};
+        const Grid grid(7, {28, 42, 14}, 283);
+        QList<float> lefts;
         for (int i = 0; i < 7; ++i)
-            QCOMPARE(model.at(i).iconLeft, lefts[i]);
-        QCOMPARE(model.at(0).iconTop, 14.0f);
-        QCOMPARE(model.at(0).captionLeft, 8.0f);
-        QCOMPARE(model.at(0).captionTop, 53.0f);
-        // The second row starts 14 below the tallest caption of the first.
-        const double firstRowBottom = 53 + 42;
-        QCOMPARE(double(model.at(3).iconTop), firstRowBottom + 14);
-        QCOMPARE(double(model.at(3).captionTop), firstRowBottom + 14 + 39);
-        const double secondRowTop = firstRowBottom + 14;
-        QCOMPARE(state.rowTops, (QList<double> {0, secondRowTop, secondRowTop + 39 + 42 + 14}));
-        QCOMPARE(state.maxColumns, 3);
-        QCOMPARE(state.nextCellX, 80.0);
-        QCOMPARE(state.lowestBottom, double(model.at(6).captionTop) + 28);
+            lefts << grid.model.at(i).iconLeft;
+        QCOMPARE(lefts, (QList<float> {24, 104, 184, 24, 104, 184, 24}));
+        const ListItem& first = grid.model.at(0);
+        QCOMPARE(QList<float>({first.iconTop, first.captionLeft, first.captionTop}), QList<float>({14, 8, 53}));
+        // The second row starts 14 below the tallest caption of the first (53 + 42).
+        QCOMPARE(QList<float>({grid.model.at(3).iconTop, grid.model.at(3).captionTop}), QList<float>({109, 148}));
+        QCOMPARE(grid.state.rowTops, (QList<double> {0, 109, 204}));
+        QCOMPARE(grid.state.maxColumns, 3);
+        QCOMPARE(grid.state.nextCellX, 80.0);
+        QCOMPARE(grid.state.lowestBottom, 243 + 28.0);
     }
 
     void arrangeBelowOneCellPutsEveryItemOnItsOwnRow()
     {
-        ListModel model = modelWithCaptions(4, {14});
-        ListLayoutState state;
-        SelectionFrame frame;
-        GridLayout::arrangeAll(model, state, frame, 79);
-        QCOMPARE(state.rowTops.size(), 5);
-        QCOMPARE(state.rowTops[1], 14.0); // the first item takes the wrap branch too
+        const Grid grid(4, {14}, 79);
+        // The first item takes the wrap branch too.
+        QCOMPARE(grid.state.rowTops, (QList<double> {0, 14, 81, 148, 215}));
         for (int i = 0; i < 4; ++i)
-            QCOMPARE(model.at(i).iconLeft, 24.0f);
-        QCOMPARE(double(model.at(1).iconTop), 53 + 14 + 14.0);
-        QCOMPARE(state.maxColumns, 1);
+            QCOMPARE(grid.model.at(i).iconLeft, 24.0f);
+        QCOMPARE(grid.state.maxColumns, 1);
     }
 
     void arrangeResetsScrollOffsetButKeepsFrameOnScreen()
     {
-        ListModel model = modelWithCaptions(3, {14});
-        ListLayoutState state;
-        state.scrollOffsetY = -120;
-        SelectionFrame frame;
-        frame.rect = QRectF(5, 200, 73, 62); // unscrolled; shown at 80
-        GridLayout::arrangeAll(model, state, frame, 400);
-        QCOMPARE(state.scrollOffsetY, 0.0);
-        QCOMPARE(frame.rect.top(), 80.0);
+        Grid grid(3, {14}, -1);
+        grid.state.scrollOffsetY = -120;
+        grid.frame.rect = QRectF(5, 200, 73, 62); // unscrolled; shown at 80
+        GridLayout::arrangeAll(grid.model, grid.state, grid.frame, 400);
+        QCOMPARE(grid.state.scrollOffsetY, 0.0);
+        QCOMPARE(grid.frame.rect.top(), 80.0);
     }
 
     void addingToScrolledListTakesLowestBottomScrolled()
     {
-        ListModel model = modelWithCaptions(1, {28});
-        ListLayoutState state;
-        SelectionFrame frame;
-        GridLayout::arrangeAll(model, state, frame, 400);
-        state.scrollOffsetY = -200;
-        ListItem& item = model.load();
-        GridLayout::placeNext(item, state, 400);
+        Grid grid(1, {28}, 400);
+        grid.state.scrollOffsetY = -200;
+        ListItem& item = grid.model.load();
+        GridLayout::placeNext(item, grid.state, 400);
         item.captionHeight = 80;
-        GridLayout::finishAdd(item, state);
-        QCOMPARE(item.iconLeft, 104.0f);
-        QCOMPARE(item.iconTop, 14.0f); // shown at -186
-        // 53 + 80 - 200 is above the first caption's bottom, so the first stays the lowest.
-        QCOMPARE(state.lowestBottom, 53.0 + 28);
-        QCOMPARE(state.nextCellX, 160.0);
+        GridLayout::finishAdd(item, grid.state);
+        QCOMPARE(QList<float>({item.iconLeft, item.iconTop}), QList<float>({104, 14})); // shown at -186
+        // 53 + 80 - 200 is above the first caption's bottom (53 + 28), so the first stays the lowest.
+        QCOMPARE(grid.state.lowestBottom, 81.0);
+        QCOMPARE(grid.state.nextCellX, 160.0);
     }
 
     void scrollRange_data()
@@ -194,10 +182,8 @@ private Q_SLOTS:
         QTest::addColumn<int>("clientHeight");
         QTest::addColumn<bool>("needed");
         QTest::addColumn<int>("maximum");
-        QTest::newRow("fits") << 5 << 200.0 << 300 << false << 0;
         QTest::newRow("exactly fits") << 5 << 300.0 << 300 << false << 0;
         QTest::newRow("one pixel more") << 5 << 301.0 << 300 << true << 15;
-        QTest::newRow("long list") << 500 << 9000.0 << 300 << true << 8714;
         QTest::newRow("taller than 16 bits") << 20000 << 400000.0 << 300 << true << 399714;
         QTest::newRow("empty list never scrolls") << 0 << 9000.0 << 300 << false << 0;
     }
@@ -220,15 +206,12 @@ private Q_SLOTS:
 
     void contentExtentIncludesFrameAndIgnoresScroll()
     {
-        ListModel model = modelWithCaptions(2, {28});
-        ListLayoutState state;
-        SelectionFrame frame;
-        GridLayout::arrangeAll(model, state, frame, 400);
-        state.scrollOffsetY = -50;
-        QCOMPARE(GridLayout::contentExtent(model, frame, state).bottom, 53.0 + 28);
-        frame.rect = QRectF(0, 0, 10, 500);
-        QCOMPARE(GridLayout::contentExtent(model, frame, state).bottom, 500.0);
-        QCOMPARE(GridLayout::contentExtent(model, frame, state).right, 88.0 + 64);
+        Grid grid(2, {28}, 400);
+        grid.state.scrollOffsetY = -50;
+        QCOMPARE(GridLayout::contentExtent(grid.model, grid.frame, grid.state).bottom, 81.0);
+        grid.frame.rect = QRectF(0, 0, 10, 500);
+        const GridLayout::Extent extent = GridLayout::contentExtent(grid.model, grid.frame, grid.state);
+        QCOMPARE(QList<double>({extent.bottom, extent.right}), QList<double>({500, 88 + 64}));
     }
 
     void snapTarget_data()
@@ -260,7 +243,6 @@ private Q_SLOTS:
         QTest::addColumn<int>("notches");
         QTest::addColumn<int>("expected");
         QTest::newRow("down one row") << 0 << 1 << 97;
-        QTest::newRow("down two rows") << 0 << 2 << 194;
         QTest::newRow("from between rows") << 120 << 1 << 194;
         QTest::newRow("last row then maximum") << 194 << 2 << 250;
         QTest::newRow("stays at maximum") << 250 << 1 << 250;
@@ -309,7 +291,6 @@ private Q_SLOTS:
         QTest::newRow("right") << 0 << 39 << 1;
         QTest::newRow("right at row end does not wrap") << 2 << 39 << -1;
         QTest::newRow("left at row start") << 3 << 37 << -1;
-        QTest::newRow("left") << 4 << 37 << 3;
         QTest::newRow("down same column") << 1 << 40 << 4;
         QTest::newRow("down to the nearest of a shorter row") << 5 << 40 << 7;
         QTest::newRow("up") << 7 << 38 << 4;
@@ -320,41 +301,34 @@ private Q_SLOTS:
         QFETCH(int, current);
         QFETCH(int, keyCode);
         QFETCH(int, expected);
-        ListModel model = modelWithCaptions(8, {28});
-        ListLayoutState state;
-        SelectionFrame frame;
-        GridLayout::arrangeAll(model, state, frame, 283);
+        const Grid grid(8, {28}, 283);
         const auto direction = KeyNavigation::directionFromKeyCode(keyCode);
         QVERIFY(direction);
-        const ListItem& item = model.at(current);
-        const std::optional<int> found
-            = KeyNavigation::findNeighbour(model, 0, current, *direction, QPointF(item.iconLeft, item.iconTop), 300);
+        const ListItem& item = grid.model.at(current);
+        const std::optional<int> found = KeyNavigation::findNeighbour(
+            grid.model, 0, current, *direction, QPointF(item.iconLeft, item.iconTop), 300);
         QCOMPARE(found.value_or(-1), expected);
     }
 
     void findNeighbourTieKeepsLowerIndex()
     {
-        ListModel model = modelWithCaptions(3, {14});
-        model.at(0).iconLeft = 100;
-        model.at(0).iconTop = 0;
-        model.at(1).iconLeft = 60;
-        model.at(1).iconTop = 100;
-        model.at(2).iconLeft = 140;
-        model.at(2).iconTop = 100;
-        const auto found
-            = KeyNavigation::findNeighbour(model, 0, 0, KeyNavigation::Direction::Down, QPointF(100, 0), 300);
-        QCOMPARE(found.value_or(-1), 1);
+        Grid grid(3, {14}, -1);
+        const QPointF places[] = {{100, 0}, {60, 100}, {140, 100}};
+        for (int i = 0; i < 3; ++i) {
+            grid.model.at(i).iconLeft = float(places[i].x());
+            grid.model.at(i).iconTop = float(places[i].y());
+        }
+        const auto down = KeyNavigation::Direction::Down;
+        QCOMPARE(KeyNavigation::findNeighbour(grid.model, 0, 0, down, places[0], 300).value_or(-1), 1);
         // Shown positions count: scrolled up by 150, nothing lies below the reference any more.
-        QVERIFY(!KeyNavigation::findNeighbour(model, -150, 0, KeyNavigation::Direction::Down, QPointF(100, 0), 300));
+        QVERIFY(!KeyNavigation::findNeighbour(grid.model, -150, 0, down, places[0], 300));
         QVERIFY(!KeyNavigation::directionFromKeyCode(13));
     }
 
     void bandsFindItemsNearAnArea()
     {
-        ListModel model = modelWithCaptions(60, {28, 90, 14});
-        ListLayoutState state;
-        SelectionFrame frame;
-        GridLayout::arrangeAll(model, state, frame, 283);
+        Grid grid(60, {28, 90, 14}, 283);
+        ListModel& model = grid.model;
         ItemBands bands;
         std::vector<int> found;
         auto reaches = [&](int i, double top, double bottom) {
@@ -375,7 +349,7 @@ private Q_SLOTS:
         }
         // Appending keeps the index current without a rebuild; invalidation rebuilds it from the model.
         ListItem& added = model.load();
-        GridLayout::placeNext(added, state, 283);
+        GridLayout::placeNext(added, grid.state, 283);
         bands.append(60, added);
         bands.collect(model, added.iconTop, added.iconTop + 1, found);
         QVERIFY(std::find(found.begin(), found.end(), 60) != found.end());

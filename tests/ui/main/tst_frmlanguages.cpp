@@ -1,28 +1,26 @@
 // The language dialog driven as the user drives it, with the real language files in a program folder.
 #include "MainWindowFixture.h"
+#include "PromptRecorder.h"
 #include "TestEnvironment.h"
 #include "i18n/frmLanguages.h"
 #include "i18n/modLocalizer.h"
 #include "store/SettingsStore.h"
-#include "support/UserPrompt.h"
 
 #include <QComboBox>
 #include <QLabel>
 #include <QPushButton>
 #include <QTest>
 
+#include "TestSuite.h"
+
 using namespace Brimvault;
+using namespace Qt::StringLiterals;
 
 namespace {
 
 QString localeSetting(const QString& key)
 {
-    return GetSetting(AppTitle(), QStringLiteral("LocaleSettings"), key);
-}
-
-QString russianName()
-{
-    return QString::fromUtf8("Русский");
+    return GetSetting(AppTitle(), u"LocaleSettings"_s, key);
 }
 
 // Opens the dialog, lets act choose, and returns what exec answered.
@@ -38,24 +36,19 @@ int runDialog(const std::function<void(frmLanguages*)>& act)
 class TestFrmLanguages : public QObject {
     Q_OBJECT
 
-private:
     std::unique_ptr<TestEnvironment> m_env;
-    QList<PromptRequest> m_prompts;
+    std::unique_ptr<PromptRecorder> m_prompts;
 
 private Q_SLOTS:
     void init()
     {
         m_env = std::make_unique<TestEnvironment>();
-        m_prompts.clear();
-        SetPromptHandler([this](const PromptRequest& request) {
-            m_prompts.append(request);
-            return PromptAnswer::Ok;
-        });
+        m_prompts = std::make_unique<PromptRecorder>();
         modLocalizer::UseBuiltInLanguage();
     }
     void cleanup()
     {
-        SetPromptHandler({});
+        m_prompts.reset();
         modLocalizer::UseBuiltInLanguage();
         m_env.reset();
     }
@@ -65,33 +58,12 @@ private Q_SLOTS:
         ProgramFolderFixture program(false);
         frmLanguages dialog;
         QCOMPARE(dialog.exec(), int(QDialog::Rejected));
-        QCOMPARE(m_prompts.size(), 1);
-        QCOMPARE(m_prompts.first().text, QStringLiteral("Language files not found"));
-        QCOMPARE(m_prompts.first().title, QStringLiteral("Brimvault"));
-        QCOMPARE(m_prompts.first().icon, PromptIcon::Exclamation);
+        QCOMPARE(m_prompts->texts(), QStringList {u"Language files not found"_s});
+        QCOMPARE(m_prompts->prompts.first().title, u"Brimvault"_s);
+        QCOMPARE(m_prompts->prompts.first().icon, PromptIcon::Exclamation);
         QVERIFY(!dialog.isVisible());
-        QVERIFY(localeSetting(QStringLiteral("LngFileName")).isEmpty());
+        QVERIFY(localeSetting(u"LngFileName"_s).isEmpty());
         QVERIFY(modLocalizer::UsesBuiltInTexts());
-    }
-
-    void listsTheBuiltInLanguageAndEveryFile()
-    {
-        ProgramFolderFixture program(true);
-        QStringList names;
-        QList<int> itemData;
-        QFont font;
-        runDialog([&](frmLanguages* dialog) {
-            for (int i = 0; i < dialog->cbLanguages()->count(); ++i) {
-                names << dialog->cbLanguages()->itemText(i);
-                itemData << dialog->cbLanguages()->itemData(i).toInt();
-            }
-            font = dialog->font();
-            dialog->cmdCancel()->click();
-        });
-        QCOMPARE(names, QStringList({QStringLiteral("English (Default)"), QStringLiteral("Polski"), russianName()}));
-        QCOMPARE(itemData, QList<int>({0, 1, 2}));
-        QCOMPARE(font.families().value(0), QStringLiteral("Verdana"));
-        QVERIFY(m_prompts.isEmpty());
     }
 
     void preselectsTheLanguageInForce_data()
@@ -99,10 +71,10 @@ private Q_SLOTS:
         QTest::addColumn<QString>("stored");
         QTest::addColumn<int>("selected");
         QTest::newRow("nothing stored") << QString() << 0;
-        QTest::newRow("built-in language") << "English (Default)" << 0;
-        QTest::newRow("Russian") << "Brimvault_Russian.lng" << 2;
-        QTest::newRow("other letter case") << "brimvault_polish.LNG" << 1;
-        QTest::newRow("file no longer there") << "Brimvault_German.lng" << 0;
+        QTest::newRow("built-in language") << u"English (Default)"_s << 0;
+        QTest::newRow("Russian") << u"Brimvault_Russian.lng"_s << 2;
+        QTest::newRow("other letter case") << u"brimvault_polish.LNG"_s << 1;
+        QTest::newRow("file no longer there") << u"Brimvault_German.lng"_s << 0;
     }
     void preselectsTheLanguageInForce()
     {
@@ -110,13 +82,17 @@ private Q_SLOTS:
         QFETCH(int, selected);
         ProgramFolderFixture program(true);
         if (!stored.isNull())
-            SaveSetting(AppTitle(), QStringLiteral("LocaleSettings"), QStringLiteral("LngFileName"), stored);
-        int shown = -1;
+            SaveSetting(AppTitle(), u"LocaleSettings"_s, u"LngFileName"_s, stored);
+        // The built-in language first, then every language file by the name it gives itself.
+        QStringList shown;
         runDialog([&](frmLanguages* dialog) {
-            shown = dialog->cbLanguages()->currentIndex();
+            for (int i = 0; i < dialog->cbLanguages()->count(); ++i)
+                shown << dialog->cbLanguages()->itemText(i);
+            shown << QString::number(dialog->cbLanguages()->currentIndex()) << dialog->font().families().value(0);
             dialog->cmdCancel()->click();
         });
-        QCOMPARE(shown, selected);
+        QCOMPARE(shown,
+            QStringList({u"English (Default)"_s, u"Polski"_s, u"Русский"_s, QString::number(selected), u"Verdana"_s}));
     }
 
     void okSwitchesTheProgramAndCancelChangesNothing()
@@ -128,16 +104,16 @@ private Q_SLOTS:
         }),
             int(QDialog::Rejected));
         QVERIFY(modLocalizer::UsesBuiltInTexts());
-        QVERIFY(localeSetting(QStringLiteral("LngFileName")).isEmpty());
+        QVERIFY(localeSetting(u"LngFileName"_s).isEmpty());
 
         QCOMPARE(runDialog([](frmLanguages* dialog) {
             dialog->cbLanguages()->setCurrentIndex(2);
             QTest::mouseClick(dialog->cmdOK(), Qt::LeftButton);
         }),
             int(QDialog::Accepted));
-        QCOMPARE(localeSetting(QStringLiteral("LngFileName")), QStringLiteral("Brimvault_Russian.lng"));
-        QCOMPARE(localeSetting(QStringLiteral("LngNik")), QStringLiteral("RUSSIAN"));
-        QCOMPARE(modLocalizer::LanguageName(), russianName());
+        QCOMPARE(localeSetting(u"LngFileName"_s), u"Brimvault_Russian.lng"_s);
+        QCOMPARE(localeSetting(u"LngNik"_s), u"RUSSIAN"_s);
+        QCOMPARE(modLocalizer::LanguageName(), u"Русский"_s);
 
         // Opened again, the dialog speaks the language in force.
         QStringList captions;
@@ -147,19 +123,17 @@ private Q_SLOTS:
             dialog->cbLanguages()->setCurrentIndex(0);
             dialog->cmdOK()->click();
         });
-        QCOMPARE(captions,
-            QStringList({QString::fromUtf8("Язык программы"), QString::fromUtf8("Пожалуйста, выберите язык:"),
-                QStringLiteral("OK"), QString::fromUtf8("Отмена")}));
+        QCOMPARE(captions, QStringList({u"Язык программы"_s, u"Пожалуйста, выберите язык:"_s, u"OK"_s, u"Отмена"_s}));
 
         // English (Default) returns to the built-in texts.
         QVERIFY(modLocalizer::UsesBuiltInTexts());
-        QCOMPARE(localeSetting(QStringLiteral("LngFileName")), QStringLiteral("English (Default)"));
-        QCOMPARE(localeSetting(QStringLiteral("LngNik")), QStringLiteral("ENG"));
+        QCOMPARE(localeSetting(u"LngFileName"_s), u"English (Default)"_s);
+        QCOMPARE(localeSetting(u"LngNik"_s), u"ENG"_s);
         frmLanguages english;
-        QCOMPARE(english.windowTitle(), QStringLiteral("Program language"));
-        QCOMPARE(english.labLanguages()->text(), QStringLiteral("Please, select the language:"));
+        QCOMPARE(english.windowTitle(), u"Program language"_s);
+        QCOMPARE(english.labLanguages()->text(), u"Please, select the language:"_s);
     }
 };
 
-QTEST_MAIN(TestFrmLanguages)
+BV_REGISTER_TEST(TestFrmLanguages);
 #include "tst_frmlanguages.moc"

@@ -1,16 +1,16 @@
 // The real main window over a temporary library, driven with the mouse, the keyboard and its menus.
 #include "MainWindowFixture.h"
+#include "PromptRecorder.h"
 #include "TestEnvironment.h"
+
 #include "i18n/ApplyLanguage.h"
 #include "i18n/frmLanguages.h"
 #include "i18n/modLocalizer.h"
 #include "store/SettingsStore.h"
-#include "support/UserPrompt.h"
 #include "ui/listview/ImageCtrl.h"
 #include "ui/listview/ListElements.h"
 #include "ui/listview/SimpleListView.h"
 #include "ui/main/ClickLabel.h"
-#include "ui/main/MainWindowDesign.h"
 #include "ui/main/frmMain.h"
 
 #include <QAction>
@@ -27,16 +27,9 @@
 #include <QTimer>
 
 using namespace Brimvault;
+using namespace Qt::StringLiterals;
 
 namespace {
-
-QStringList names(std::initializer_list<const char*> list)
-{
-    QStringList result;
-    for (const char* name : list)
-        result << QString::fromLatin1(name);
-    return result;
-}
 
 QString setting(const QString& section, const QString& key)
 {
@@ -51,11 +44,6 @@ QStringList captionsOf(SimpleListView* list)
     return captions;
 }
 
-int indexOfCaption(SimpleListView* list, const QString& caption)
-{
-    return int(captionsOf(list).indexOf(caption));
-}
-
 bool samePicture(const QPixmap& a, const QPixmap& b)
 {
     return !a.isNull()
@@ -63,34 +51,29 @@ bool samePicture(const QPixmap& a, const QPixmap& b)
 }
 
 // The names of a menu's items in order, "-" for a separator.
-QStringList menuLayout(QMenu* menu)
+QString menuLayout(QMenu* menu)
 {
     QStringList names;
     for (QAction* action : menu->actions())
-        names << (action->isSeparator() ? QStringLiteral("-") : action->objectName());
-    return names;
+        names << (action->isSeparator() ? u"-"_s : action->objectName());
+    return names.join(u' ');
 }
 
-QString captionOf(frmMain* window, const QString& name)
-{
-    if (name == u"frmMain")
-        return window->windowTitle();
-    if (name == u"mnuActions")
-        return window->mnuActions()->title();
-    if (auto* action = window->menuItem(name))
-        return action->text();
-    return window->findChild<QLabel*>(name)->text();
-}
+// What a file dialog showed when it opened.
+struct DialogSeen {
+    QString title;
+    QString folder;
+    QStringList filters;
+};
 
 } // namespace
 
 class TestFrmMain : public QObject {
     Q_OBJECT
 
-private:
     std::unique_ptr<TestEnvironment> m_env;
     std::unique_ptr<ProgramFolderFixture> m_program;
-    QList<PromptRequest> m_prompts;
+    std::unique_ptr<PromptRecorder> m_prompts;
 
     // Shows a new window and waits until discovery has filled its list.
     std::unique_ptr<frmMain> openWindow()
@@ -103,11 +86,33 @@ private:
         return window;
     }
 
-    static void waitForIcons(frmMain* window) { QTRY_COMPARE_WITH_TIMEOUT(window->pendingIcons(), 0, 10000); }
-
-    void switchTo(const QString& fileName)
+    // Triggers a menu item whose command opens a file dialog, chooses `path` in it (cancels for an empty
+    // path) and returns what the dialog showed.
+    DialogSeen throughFileDialog(frmMain* window, const QString& item, const QString& path)
     {
-        modLocalizer::SwitchLanguage(fileName.isEmpty() ? QString() : m_program->path() + u'/' + fileName);
+        DialogSeen seen;
+        WhenModalShows([&](QWidget* modal) {
+            auto* dialog = qobject_cast<QFileDialog*>(modal);
+            QVERIFY(dialog);
+            seen = {dialog->windowTitle(), dialog->directory().absolutePath(), dialog->nameFilters()};
+            if (path.isEmpty())
+                dialog->reject();
+            else
+                ChooseInFileDialog(dialog, path);
+        });
+        window->menuItem(item)->trigger();
+        return seen;
+    }
+
+    void chooseLanguage(frmMain* window, int entry)
+    {
+        WhenModalShows([entry](QWidget* modal) {
+            auto* dialog = qobject_cast<frmLanguages*>(modal);
+            QVERIFY(dialog);
+            dialog->cbLanguages()->setCurrentIndex(entry);
+            QTest::mouseClick(dialog->cmdOK(), Qt::LeftButton);
+        });
+        window->menuItem(u"mnuLanguage"_s)->trigger();
     }
 
 private Q_SLOTS:
@@ -117,445 +122,286 @@ private Q_SLOTS:
         m_program = std::make_unique<ProgramFolderFixture>(true);
         QVERIFY(RegisterQuillet());
         modLocalizer::UseBuiltInLanguage();
-        m_prompts.clear();
-        SetPromptHandler([this](const PromptRequest& request) {
-            m_prompts.append(request);
-            return PromptAnswer::Ok;
-        });
+        m_prompts = std::make_unique<PromptRecorder>(PromptAnswer::No);
     }
     void cleanup()
     {
-        SetPromptHandler({});
+        m_prompts.reset();
         modLocalizer::UseBuiltInLanguage();
         m_program.reset();
         m_env.reset();
     }
 
-    void captionsFollowTheLanguage_data()
-    {
-        QTest::addColumn<QString>("name");
-        QTest::addColumn<QString>("english");
-        QTest::addColumn<QString>("russian");
-        const auto row = [](const char* name, const char* english, const char* russian) {
-            QTest::newRow(name) << QString::fromLatin1(name) << QString::fromUtf8(english)
-                                << QString::fromUtf8(russian);
-        };
-        row("frmMain", "Brimvault", "Brimvault");
-        row("labActions", "Actions", "Действия");
-        row("Label2", "Brimvault", "Brimvault");
-        row("Label3", "Brimvault", "Brimvault");
-        row("Label4", "Copyright © Brimvault Games. All rights reserved.", "© Brimvault Games. Все права защищены.");
-        row("mnuActions", "Actions", "Действия");
-        row("mnuAddFile", "Add game file...", "Добавить файл игры...");
-        row("mnuAddFolder", "Add games from folder...", "Добавить игры из папки...");
-        row("mnuInstall", "Install game...", "Установить игру...");
-        row("mnuGetMoreGames", "Get more games...", "Больше игр...");
-        row("mnuActionRemoveFile", "Remove game...", "Удалить игру...");
-        row("mnuActionRemoveAllFiles", "Remove all added games...", "Удалить все добавленные игры...");
-        row("mnuLanguage", "Language...", "Язык...");
-        row("mnuHelp", "Help...", "Справка...");
-        row("mnuAbout", "About...", "О программе...");
-        row("mnuOpenGame", "Open game offline", "Открыть игру без Интернета");
-        row("mnuRenameGame", "Rename game", "Переименовать игру");
-        row("mnuRemoveFile", "Remove game...", "Удалить игру...");
-    }
-    void captionsFollowTheLanguage()
-    {
-        QFETCH(QString, name);
-        QFETCH(QString, english);
-        QFETCH(QString, russian);
-        frmMain window;
-        QCOMPARE(captionOf(&window, name), english);
-        switchTo(QStringLiteral("Brimvault_Russian.lng"));
-        QCOMPARE(captionOf(&window, name), russian);
-        switchTo(QString());
-        QCOMPARE(captionOf(&window, name), english);
-    }
-
-    void actionsButtonOpensTheActionsMenu_data()
-    {
-        QTest::addColumn<QString>("button");
-        QTest::newRow("label") << "labActions";
-        QTest::newRow("image") << "imgActions";
-    }
-    void actionsButtonOpensTheActionsMenu()
-    {
-        QFETCH(QString, button);
-        auto window = openWindow();
-        QVERIFY(!window->mnuActions()->isVisible());
-        QTest::mouseClick(window->findChild<ClickLabel*>(button), Qt::LeftButton);
-        QTRY_VERIFY(window->mnuActions()->isVisible());
-        QCOMPARE(menuLayout(window->mnuActions()),
-            names({"mnuAddFile", "mnuAddFolder", "mnuInstall", "-", "mnuGetMoreGames", "-", "mnuActionRemoveFile",
-                "mnuActionRemoveAllFiles", "-", "mnuLanguage", "-", "mnuHelp", "-", "mnuAbout"}));
-        window->mnuActions()->hide();
-    }
-
-    void rightClickOpensTheItemMenuOnTheClickedItem()
+    void menusOpenFromTheirButtonsAndOnRightClick()
     {
         BuildSampleLibrary(*m_env);
         auto window = openWindow();
+        for (const char* button : {"labActions", "imgActions"}) {
+            QTest::mouseClick(window->findChild<ClickLabel*>(QString::fromLatin1(button)), Qt::LeftButton);
+            QTRY_VERIFY(window->mnuActions()->isVisible());
+            window->mnuActions()->hide();
+        }
+        QCOMPARE(menuLayout(window->mnuActions()),
+            u"mnuAddFile mnuAddFolder mnuInstall - mnuGetMoreGames - mnuActionRemoveFile mnuActionRemoveAllFiles - "
+            "mnuLanguage - mnuHelp - mnuAbout"_s);
+        QCOMPARE(menuLayout(window->mnuItemPopup()), u"mnuOpenGame - mnuRenameGame mnuRemoveFile"_s);
+
+        // A right click selects the item and opens the item menu after a short timer; a left click opens nothing.
         SimpleListView* list = window->ListView1();
-        QCOMPARE(menuLayout(window->mnuItemPopup()), names({"mnuOpenGame", "-", "mnuRenameGame", "mnuRemoveFile"}));
         QTest::mouseClick(list, Qt::RightButton, {}, list->imgN(2).geometry().center().toPoint());
         QCOMPARE(list->currentIndex(), 2);
         QVERIFY(!window->mnuItemPopup()->isVisible());
         QTRY_VERIFY(window->mnuItemPopup()->isVisible());
         window->mnuItemPopup()->hide();
-        // A left click opens nothing.
         QTest::mouseClick(list, Qt::LeftButton, {}, list->imgN(1).geometry().center().toPoint());
         QTest::qWait(150);
         QVERIFY(!window->mnuItemPopup()->isVisible());
     }
 
-    void listKeepsItsMarginsOnResize()
-    {
-        auto window = openWindow();
-        if (window->logicalDpiX() != 96)
-            QSKIP("the margins are checked at 96 dots per inch");
-        window->resize(760, 552);
-        QCOMPARE(window->ListView1()->geometry(), QRect(13, 84, 743, 464));
-        window->resize(500, 400);
-        QCOMPARE(window->ListView1()->geometry(), QRect(13, 84, 483, 312));
-        // Narrower than 260 twips: the list keeps its last place and stays visible.
-        window->resize(17, 400);
-        QCOMPARE(window->ListView1()->geometry(), QRect(13, 84, 483, 312));
-        QVERIFY(window->ListView1()->isVisible());
-    }
-
     void listFilledFromTheLibrary()
     {
-        const SampleLibrary library = BuildSampleLibrary(*m_env);
+        const QString added = BuildSampleLibrary(*m_env);
         auto window = openWindow();
         SimpleListView* list = window->ListView1();
         QCOMPARE(list->layoutState().itemCount, 14);
         QCOMPARE(list->currentIndex(), 0);
-
-        QCOMPARE(list->labN(0).text(), QStringLiteral("Online games"));
-        QCOMPARE(list->labN(0).tag(), QStringLiteral("http://127.0.0.1:9/online-games-catalog.asp"));
+        QCOMPARE(list->labN(0).text(), u"Online games"_s);
+        QCOMPARE(list->labN(0).tag(), u"http://127.0.0.1:9/online-games-catalog.asp"_s);
         QVERIFY(samePicture(list->imgN(0).Picture(), window->imgOnLine()->Picture()));
-
+        QCOMPARE(list->labN(13).text(), u"My Puzzle"_s);
+        QCOMPARE(list->labN(13).tag(), added);
         const QStringList captions = captionsOf(list);
-        QCOMPARE(captions.last(), QStringLiteral("My Puzzle"));
-        QCOMPARE(list->labN(13).tag(), library.addedGame);
-        QVERIFY(!list->imgN(13).Picture().isNull());
-        for (const char* name : {"Color Lines", "Mahjong Garden", "Sudoku Master", "Chess 3D", "Klondike Solitaire",
-                 "Aquarium", "Street Racer", "Jewel Match", "Air Hockey", "Happy Farm"}) {
-            const int index = indexOfCaption(list, QString::fromLatin1(name));
-            QVERIFY2(index > 0, qPrintable(captions.join(u'|')));
-            QVERIFY2(!list->imgN(index).Picture().isNull(), name);
+        // Names from information files, an icon beside the game, an icon from the cache.
+        for (const QString& name : {u"Color Lines"_s, u"Happy Farm"_s, u"My Puzzle"_s}) {
+            const int at = int(captions.indexOf(name));
+            QVERIFY2(at > 0 && !list->imgN(at).Picture().isNull(), qPrintable(name));
         }
-        const int movie = indexOfCaption(list, QStringLiteral("Bubble Shooter"));
-        QVERIFY(movie > 0);
-        QVERIFY(samePicture(list->imgN(movie).Picture(), window->imgSWF()->Picture()));
-
+        QVERIFY(
+            samePicture(list->imgN(int(captions.indexOf(u"Bubble Shooter"_s))).Picture(), window->imgSWF()->Picture()));
         // The game without an icon waits for the icon cache builder, which gives it the no-icon picture.
-        const int snake = indexOfCaption(list, QStringLiteral("snake"));
-        QVERIFY(snake > 0);
-        waitForIcons(window.get());
-        QVERIFY(samePicture(list->imgN(snake).Picture(), window->imgNoIcon()->Picture()));
+        QTRY_COMPARE_WITH_TIMEOUT(window->pendingIcons(), 0, 10000);
+        QVERIFY(samePicture(list->imgN(int(captions.indexOf(u"snake"_s))).Picture(), window->imgNoIcon()->Picture()));
         QVERIFY(!window->tmrIcons()->isActive());
     }
 
     void addFileThroughTheDialog()
     {
-        const QString folder = m_env->path(QStringLiteral("personal/Games"));
-        const QString game = folder + QStringLiteral("/chess.exe");
+        const QString folder = m_env->path(u"personal/Games"_s);
+        const QString game = folder + u"/chess.exe"_s;
         QVERIFY(WriteFile(game));
         auto window = openWindow();
-        const int before = window->ListView1()->layoutState().itemCount;
-
-        QString title;
-        QString directory;
-        QStringList filters;
-        WhenModalShows([&](QWidget* modal) {
-            auto* dialog = qobject_cast<QFileDialog*>(modal);
-            QVERIFY(dialog);
-            title = dialog->windowTitle();
-            directory = dialog->directory().absolutePath();
-            filters = dialog->nameFilters();
-            ChooseInFileDialog(dialog, game);
-        });
-        window->menuItem(QStringLiteral("mnuAddFile"))->trigger();
-        QCOMPARE(title, QStringLiteral("Add game file"));
-        QCOMPARE(directory, m_env->path(QStringLiteral("personal")));
-        QCOMPARE(filters,
-            QStringList({QStringLiteral("All files (*.exe *.swf)"), QStringLiteral("EXE files (*.exe)"),
-                QStringLiteral("SWF files (*.swf)")}));
-        QCOMPARE(setting(QStringLiteral("Files"), QStringLiteral("Count")), QStringLiteral("1"));
-        QCOMPARE(setting(QStringLiteral("Files"), QStringLiteral("File1")), game);
-        QCOMPARE(window->ListView1()->layoutState().itemCount, before + 1);
-        QCOMPARE(window->ListView1()->labN(before).text(), QStringLiteral("chess"));
+        SimpleListView* list = window->ListView1();
+        const int before = list->layoutState().itemCount;
+        const DialogSeen seen = throughFileDialog(window.get(), u"mnuAddFile"_s, game);
+        QCOMPARE(seen.title, u"Add game file"_s);
+        QCOMPARE(seen.folder, m_env->path(u"personal"_s));
+        QCOMPARE(
+            seen.filters, QStringList({u"All files (*.exe *.swf)"_s, u"EXE files (*.exe)"_s, u"SWF files (*.swf)"_s}));
+        QCOMPARE(QStringList({setting(u"Files"_s, u"Count"_s), setting(u"Files"_s, u"File1"_s)}),
+            QStringList({u"1"_s, game}));
+        QCOMPARE(list->layoutState().itemCount, before + 1);
+        QCOMPARE(list->labN(before).text(), u"chess"_s);
         QCOMPARE(window->lastAddFileFolder(), folder + u'/');
-        QVERIFY(window->tmrIcons()->isActive() || window->pendingIcons() == 0);
 
         // The same file again: the dialog opens where the last one was chosen, and nothing is added.
-        WhenModalShows([&](QWidget* modal) {
-            auto* dialog = qobject_cast<QFileDialog*>(modal);
-            directory = dialog->directory().absolutePath();
-            ChooseInFileDialog(dialog, game);
-        });
-        window->menuItem(QStringLiteral("mnuAddFile"))->trigger();
-        QCOMPARE(directory, folder);
-        QCOMPARE(setting(QStringLiteral("Files"), QStringLiteral("Count")), QStringLiteral("1"));
-        QCOMPARE(window->ListView1()->layoutState().itemCount, before + 1);
-
+        QCOMPARE(throughFileDialog(window.get(), u"mnuAddFile"_s, game).folder, folder);
+        QCOMPARE(setting(u"Files"_s, u"Count"_s), u"1"_s);
         // Cancelled: nothing changes.
-        WhenModalShows([](QWidget* modal) { qobject_cast<QDialog*>(modal)->reject(); });
-        window->menuItem(QStringLiteral("mnuAddFile"))->trigger();
-        QCOMPARE(window->ListView1()->layoutState().itemCount, before + 1);
+        throughFileDialog(window.get(), u"mnuAddFile"_s, QString());
+        QCOMPARE(list->layoutState().itemCount, before + 1);
         QCOMPARE(window->lastAddFileFolder(), folder + u'/');
     }
 
     void addFolderThroughTheDialog()
     {
-        const QString root = m_env->path(QStringLiteral("personal/Pack"));
-        QVERIFY(WriteFile(root + QStringLiteral("/arcade.exe")));
-        QVERIFY(WriteFile(root + QStringLiteral("/setup.exe")));
-        QVERIFY(WriteFile(root + QStringLiteral("/readme.txt")));
-        QVERIFY(WriteFile(root + QStringLiteral("/Sub/racer.exe")));
-        QVERIFY(WriteFile(root + QStringLiteral("/Sub/Deeper/movie.swf")));
+        const QString root = m_env->path(u"personal/Pack"_s);
+        for (const char* file : {"arcade.exe", "setup.exe", "readme.txt", "Sub/racer.exe", "Sub/Deeper/movie.swf"})
+            QVERIFY(WriteFile(root + u'/' + QString::fromLatin1(file)));
         auto window = openWindow();
-        const int before = window->ListView1()->layoutState().itemCount;
-
-        QString title;
-        WhenModalShows([&](QWidget* modal) {
-            auto* dialog = qobject_cast<QFileDialog*>(modal);
-            QVERIFY(dialog);
-            title = dialog->windowTitle();
-            ChooseInFileDialog(dialog, root);
-        });
-        window->menuItem(QStringLiteral("mnuAddFolder"))->trigger();
-        QCOMPARE(title, QStringLiteral("Add games from folder"));
-        QCOMPARE(setting(QStringLiteral("Files"), QStringLiteral("Count")), QStringLiteral("3"));
+        SimpleListView* list = window->ListView1();
+        const int before = list->layoutState().itemCount;
+        QCOMPARE(throughFileDialog(window.get(), u"mnuAddFolder"_s, root).title, u"Add games from folder"_s);
+        QCOMPARE(setting(u"Files"_s, u"Count"_s), u"3"_s);
         QStringList stored;
-        for (const char* key : {"File1", "File2", "File3"})
-            stored << QDir::cleanPath(setting(QStringLiteral("Files"), QString::fromLatin1(key)));
+        for (int i = 1; i <= 3; ++i) {
+            const QString recorded = setting(u"Files"_s, u"File%1"_s.arg(i));
+            // Each added game is shown at once, in the order it was recorded.
+            QCOMPARE(list->labN(before + i - 1).tag(), recorded);
+            stored << QDir::cleanPath(recorded);
+        }
         stored.sort();
         QCOMPARE(stored,
-            QStringList({root + QStringLiteral("/Sub/Deeper/movie.swf"), root + QStringLiteral("/Sub/racer.exe"),
-                root + QStringLiteral("/arcade.exe")}));
-        // Each added game is shown at once, in the order it was recorded.
-        QStringList shown = captionsOf(window->ListView1()).mid(before);
-        QCOMPARE(shown.size(), 3);
-        for (int i = 0; i < 3; ++i) {
-            const QString recorded = setting(QStringLiteral("Files"), QStringLiteral("File%1").arg(i + 1));
-            QCOMPARE(window->ListView1()->labN(before + i).tag(), recorded);
-        }
-        const int movie = before + int(shown.indexOf(QStringLiteral("movie")));
-        QVERIFY(samePicture(window->ListView1()->imgN(movie).Picture(), window->imgSWF()->Picture()));
+            QStringList({root + u"/Sub/Deeper/movie.swf"_s, root + u"/Sub/racer.exe"_s, root + u"/arcade.exe"_s}));
+        const int movie = before + int(captionsOf(list).mid(before).indexOf(u"movie"_s));
+        QVERIFY(samePicture(list->imgN(movie).Picture(), window->imgSWF()->Picture()));
     }
 
     void droppedExecutablesAreAdded()
     {
-        const QString first = m_env->path(QStringLiteral("personal/Drop/first.exe"));
-        const QString movie = m_env->path(QStringLiteral("personal/Drop/movie.swf"));
-        const QString second = m_env->path(QStringLiteral("personal/Drop/second.EXE"));
+        const QString first = m_env->path(u"personal/Drop/first.exe"_s);
+        const QString movie = m_env->path(u"personal/Drop/movie.swf"_s);
+        const QString second = m_env->path(u"personal/Drop/second.EXE"_s);
         for (const QString& file : {first, movie, second})
             QVERIFY(WriteFile(file));
         auto window = openWindow();
         SimpleListView* list = window->ListView1();
         const int before = list->layoutState().itemCount;
-        QVERIFY(list->acceptDrops());
-
         QMimeData mime;
         mime.setUrls({QUrl::fromLocalFile(first), QUrl::fromLocalFile(movie), QUrl::fromLocalFile(second)});
         QDragEnterEvent enter(QPoint(40, 40), Qt::CopyAction, &mime, Qt::LeftButton, Qt::NoModifier);
         QApplication::sendEvent(list, &enter);
-        QVERIFY(enter.isAccepted());
         QDropEvent drop(QPointF(40, 40), Qt::CopyAction, &mime, Qt::LeftButton, Qt::NoModifier);
         QApplication::sendEvent(list, &drop);
         QVERIFY(drop.isAccepted());
 
-        QCOMPARE(setting(QStringLiteral("Files"), QStringLiteral("Count")), QStringLiteral("2"));
-        QCOMPARE(setting(QStringLiteral("Files"), QStringLiteral("File1")), first);
-        QCOMPARE(setting(QStringLiteral("Files"), QStringLiteral("File2")), second);
-        QCOMPARE(captionsOf(list).mid(before), QStringList({QStringLiteral("first"), QStringLiteral("second")}));
+        QCOMPARE(QStringList({setting(u"Files"_s, u"Count"_s), setting(u"Files"_s, u"File1"_s),
+                     setting(u"Files"_s, u"File2"_s)}),
+            QStringList({u"2"_s, first, second}));
+        QCOMPARE(captionsOf(list).mid(before), QStringList({u"first"_s, u"second"_s}));
         // Their icons wait for the icon timer's next run: a drop does not start it.
         QCOMPARE(window->pendingIcons(), 2);
         QVERIFY(!window->tmrIcons()->isActive());
-    }
-
-    void languageDialogWithoutFilesChangesNothing()
-    {
-        m_program.reset();
-        m_program = std::make_unique<ProgramFolderFixture>(false);
-        auto window = openWindow();
-        QSignalSpy rebuilt(window.get(), &frmMain::listRebuilt);
-        window->menuItem(QStringLiteral("mnuLanguage"))->trigger();
-        QCOMPARE(m_prompts.size(), 1);
-        QCOMPARE(m_prompts.first().text, QStringLiteral("Language files not found"));
-        QCOMPARE(window->labActions()->text(), QStringLiteral("Actions"));
-        QVERIFY(setting(QStringLiteral("LocaleSettings"), QStringLiteral("LngFileName")).isEmpty());
-        // The list is rebuilt whatever happened in the dialog.
-        QCOMPARE(rebuilt.count(), 1);
     }
 
     void languageDialogSwitchesWindowAndGameNames()
     {
         BuildSampleLibrary(*m_env);
         auto window = openWindow();
-        const auto choose = [&](int entry) {
-            WhenModalShows([entry](QWidget* modal) {
-                auto* dialog = qobject_cast<frmLanguages*>(modal);
-                QVERIFY(dialog);
-                dialog->cbLanguages()->setCurrentIndex(entry);
-                QTest::mouseClick(dialog->cmdOK(), Qt::LeftButton);
-            });
-            window->menuItem(QStringLiteral("mnuLanguage"))->trigger();
+        const auto captions = [&] {
+            QStringList texts {window->windowTitle(), window->mnuActions()->title()};
+            for (const char* label : {"labActions", "Label2", "Label3", "Label4"})
+                texts << window->findChild<QLabel*>(QString::fromLatin1(label))->text();
+            for (const char* item : {"mnuAddFile", "mnuAddFolder", "mnuInstall", "mnuGetMoreGames",
+                     "mnuActionRemoveFile", "mnuActionRemoveAllFiles", "mnuLanguage", "mnuHelp", "mnuAbout",
+                     "mnuOpenGame", "mnuRenameGame", "mnuRemoveFile"})
+                texts << window->menuItem(QString::fromLatin1(item))->text();
+            return texts;
         };
-
-        choose(2);
-        QCOMPARE(setting(QStringLiteral("LocaleSettings"), QStringLiteral("LngFileName")),
-            QStringLiteral("Brimvault_Russian.lng"));
-        QCOMPARE(window->labActions()->text(), QString::fromUtf8("Действия"));
-        QCOMPARE(window->menuItem(QStringLiteral("mnuAbout"))->text(), QString::fromUtf8("О программе..."));
-        QCOMPARE(window->ListView1()->labN(0).text(), QString::fromUtf8("Онлайн-игры"));
+        const QStringList english {u"Brimvault"_s, u"Actions"_s, u"Actions"_s, u"Brimvault"_s, u"Brimvault"_s,
+            u"Copyright © Brimvault Games. All rights reserved."_s, u"Add game file..."_s,
+            u"Add games from folder..."_s, u"Install game..."_s, u"Get more games..."_s, u"Remove game..."_s,
+            u"Remove all added games..."_s, u"Language..."_s, u"Help..."_s, u"About..."_s, u"Open game offline"_s,
+            u"Rename game"_s, u"Remove game..."_s};
+        QCOMPARE(captions(), english);
+        QSignalSpy rebuilt(window.get(), &frmMain::listRebuilt);
+        chooseLanguage(window.get(), 2);
+        // The translations themselves belong to the language files; here every caption must follow.
+        const QStringList russian = captions();
+        for (qsizetype i = 1; i < english.size(); ++i)
+            QVERIFY2(i == 3 || i == 4 || russian.at(i) != english.at(i), qPrintable(english.at(i)));
+        QStringList names = captionsOf(window->ListView1());
+        QCOMPARE(names.value(0), u"Онлайн-игры"_s);
         // Names from the games' information files, and the publisher's own names by file title.
-        QVERIFY(indexOfCaption(window->ListView1(), QString::fromUtf8("Цветные линии")) > 0);
-        QVERIFY(indexOfCaption(window->ListView1(), QString::fromUtf8("Змейка")) > 0);
-        QCOMPARE(indexOfCaption(window->ListView1(), QStringLiteral("Color Lines")), -1);
+        QVERIFY(names.contains(u"Цветные линии"_s) && names.contains(u"Змейка"_s));
+        QVERIFY(!names.contains(u"Color Lines"_s));
 
-        choose(0);
-        QCOMPARE(setting(QStringLiteral("LocaleSettings"), QStringLiteral("LngFileName")),
-            QStringLiteral("English (Default)"));
-        QCOMPARE(window->labActions()->text(), QStringLiteral("Actions"));
-        QVERIFY(indexOfCaption(window->ListView1(), QStringLiteral("Color Lines")) > 0);
-        QVERIFY(indexOfCaption(window->ListView1(), QStringLiteral("snake")) > 0);
-        QVERIFY(m_prompts.isEmpty());
+        chooseLanguage(window.get(), 0);
+        QCOMPARE(captions(), english);
+        names = captionsOf(window->ListView1());
+        QVERIFY(names.contains(u"Color Lines"_s) && names.contains(u"snake"_s));
+        QCOMPARE(rebuilt.count(), 2);
+        QVERIFY(m_prompts->prompts.isEmpty());
     }
 
-    void helpFollowsTheLanguage_data()
+    void languageDialogWithoutFilesStillRebuildsTheList()
     {
-        QTest::addColumn<QString>("languageFile");
-        QTest::addColumn<QString>("helpFile");
-        QTest::newRow("built-in language") << QString() << QString();
-        QTest::newRow("Russian") << "Brimvault_Russian.lng"
-                                 << "Brimvault_Russian.html";
-        QTest::newRow("Polish") << "Brimvault_Polish.lng"
-                                << "Brimvault_Polish.html";
+        m_program = std::make_unique<ProgramFolderFixture>(false);
+        auto window = openWindow();
+        QSignalSpy rebuilt(window.get(), &frmMain::listRebuilt);
+        window->menuItem(u"mnuLanguage"_s)->trigger();
+        QCOMPARE(m_prompts->prompts.size(), 1);
+        QCOMPARE(rebuilt.count(), 1);
     }
-    void helpFollowsTheLanguage()
+
+    void addressesOpenInTheBrowser()
     {
-        QFETCH(QString, languageFile);
-        QFETCH(QString, helpFile);
-        frmMain window;
-        switchTo(languageFile);
-        const QString expected
-            = helpFile.isEmpty() ? m_program->builtInHelpFile() : m_program->path() + u'/' + helpFile;
-        QVERIFY(QFileInfo::exists(expected));
+        auto window = openWindow();
         UrlCatcher catcher;
-        window.menuItem(QStringLiteral("mnuHelp"))->trigger();
-        QCOMPARE(catcher.opened, QList<QUrl> {QUrl::fromLocalFile(expected)});
+        window->ListView1()->setFocus();
+        QTest::keyClick(window->ListView1(), Qt::Key_Return);
+        window->menuItem(u"mnuGetMoreGames"_s)->trigger();
+        window->menuItem(u"mnuHelp"_s)->trigger();
+        // The help page follows the language.
+        modLocalizer::SwitchLanguage(m_program->path() + u"/Brimvault_Russian.lng"_s);
+        window->menuItem(u"mnuHelp"_s)->trigger();
+        QCOMPARE(catcher.opened,
+            QList<QUrl>({QUrl(u"http://127.0.0.1:9/online-games-catalog.asp"_s),
+                QUrl(u"http://127.0.0.1:9/more-games.asp?product=Brimvault"_s),
+                QUrl::fromLocalFile(m_program->builtInHelpFile()),
+                QUrl::fromLocalFile(m_program->path() + u"/Brimvault_Russian.html"_s)}));
     }
 
-    void moreGamesAndAboutThroughTheDialogLibrary()
+    void aboutThroughTheDialogLibrary()
     {
         frmMain window;
-        UrlCatcher catcher;
-        window.menuItem(QStringLiteral("mnuGetMoreGames"))->trigger();
-        QCOMPARE(
-            catcher.opened, QList<QUrl> {QUrl(QStringLiteral("http://127.0.0.1:9/more-games.asp?product=Brimvault"))});
-
         QStringList shown;
         WhenModalShows([&](QWidget* modal) {
             for (const char* name : {"labCaption", "labVersion", "labCopyright"})
                 shown << modal->findChild<QLabel*>(QString::fromLatin1(name))->text();
             qobject_cast<QDialog*>(modal)->accept();
         });
-        window.menuItem(QStringLiteral("mnuAbout"))->trigger();
+        window.menuItem(u"mnuAbout"_s)->trigger();
         QCOMPARE(shown,
-            QStringList({QStringLiteral("Brimvault"), QStringLiteral("Version " BRIMVAULT_VERSION),
-                QString::fromUtf8("Copyright © Brimvault Games. All rights reserved.")}));
-    }
-
-    void enterOnTheOnlineEntryOpensTheCatalogue()
-    {
-        auto window = openWindow();
-        UrlCatcher catcher;
-        window->ListView1()->setFocus();
-        QTest::keyClick(window->ListView1(), Qt::Key_Return);
-        QCOMPARE(catcher.opened, QList<QUrl> {QUrl(QStringLiteral("http://127.0.0.1:9/online-games-catalog.asp"))});
+            QStringList({u"Brimvault"_s, QStringLiteral("Version " BRIMVAULT_VERSION),
+                u"Copyright © Brimvault Games. All rights reserved."_s}));
     }
 
     void itemMenuRenamesAndRemovesTheClickedGame()
     {
-        const SampleLibrary library = BuildSampleLibrary(*m_env);
+        const QString added = BuildSampleLibrary(*m_env);
         auto window = openWindow();
         SimpleListView* list = window->ListView1();
-        const int added = indexOfCaption(list, QStringLiteral("My Puzzle"));
-        QTest::mouseClick(list, Qt::LeftButton, {}, list->imgN(added).geometry().center().toPoint());
-
-        QList<InputRequest> asked;
-        SetInputHandler([&](const InputRequest& request) -> std::optional<QString> {
-            asked.append(request);
-            return QStringLiteral("Evening Puzzle");
-        });
-        window->menuItem(QStringLiteral("mnuRenameGame"))->trigger();
-        SetInputHandler({});
-        QCOMPARE(asked.size(), 1);
-        QCOMPARE(asked.first().defaultText, QStringLiteral("My Puzzle"));
-        QCOMPARE(list->labN(added).text(), QStringLiteral("Evening Puzzle"));
-        QCOMPARE(setting(QStringLiteral("FilesNames"), QStringLiteral("FileName1")), QStringLiteral("Evening Puzzle"));
+        const int index = int(captionsOf(list).indexOf(u"My Puzzle"_s));
+        QTest::mouseClick(list, Qt::LeftButton, {}, list->imgN(index).geometry().center().toPoint());
+        m_prompts->inputText = u"Evening Puzzle"_s;
+        window->menuItem(u"mnuRenameGame"_s)->trigger();
+        QCOMPARE(m_prompts->inputs.size(), 1);
+        QCOMPARE(m_prompts->inputs.first().defaultText, u"My Puzzle"_s);
+        QCOMPARE(list->labN(index).text(), u"Evening Puzzle"_s);
+        QCOMPARE(setting(u"FilesNames"_s, u"FileName1"_s), u"Evening Puzzle"_s);
 
         const int before = list->layoutState().itemCount;
-        window->menuItem(QStringLiteral("mnuRemoveFile"))->trigger();
-        QCOMPARE(m_prompts.size(), 1);
-        QCOMPARE(m_prompts.first().text, QStringLiteral("Remove Evening Puzzle?"));
-        QCOMPARE(m_prompts.first().buttons, PromptButtons::YesNo);
-        // The recording handler answers Ok, which is not Yes: nothing is removed.
-        QCOMPARE(list->layoutState().itemCount, before);
-
-        SetPromptHandler([](const PromptRequest&) { return PromptAnswer::Yes; });
-        window->menuItem(QStringLiteral("mnuRemoveFile"))->trigger();
+        window->menuItem(u"mnuRemoveFile"_s)->trigger();
+        QCOMPARE(m_prompts->texts(), QStringList {u"Remove Evening Puzzle?"_s});
+        QCOMPARE(m_prompts->prompts.first().buttons, PromptButtons::YesNo);
+        QCOMPARE(list->layoutState().itemCount, before); // answered No
+        m_prompts->answer = PromptAnswer::Yes;
+        window->menuItem(u"mnuRemoveFile"_s)->trigger();
         QCOMPARE(list->layoutState().itemCount, before - 1);
-        QCOMPARE(indexOfCaption(list, QStringLiteral("Evening Puzzle")), -1);
-        QVERIFY(setting(QStringLiteral("Files"), QStringLiteral("File1")).isEmpty());
-        QVERIFY(QFileInfo::exists(library.addedGame));
+        QVERIFY(!captionsOf(list).contains(u"Evening Puzzle"_s));
+        QVERIFY(setting(u"Files"_s, u"File1"_s).isEmpty());
+        QVERIFY(QFileInfo::exists(added));
     }
 
     void serviceSignalRebuildsTheList()
     {
         auto window = openWindow();
         const int before = window->ListView1()->layoutState().itemCount;
-        QVERIFY(WriteFile(m_env->path(QStringLiteral("commonappdata/Brimvault/Fresh/fresh.exe"))));
-        SaveSetting(AppTitle(), QStringLiteral("Commands"), QStringLiteral("NewGameInstalled"), QStringLiteral("1"));
+        QVERIFY(WriteFile(m_env->path(u"commonappdata/Brimvault/Fresh/fresh.exe"_s)));
+        SaveSetting(AppTitle(), u"Commands"_s, u"NewGameInstalled"_s, u"1"_s);
         QTRY_COMPARE_WITH_TIMEOUT(window->ListView1()->layoutState().itemCount, before + 1, 8000);
-        QCOMPARE(setting(QStringLiteral("Commands"), QStringLiteral("NewGameInstalled")), QStringLiteral("0"));
-        QVERIFY(indexOfCaption(window->ListView1(), QStringLiteral("fresh")) > 0);
+        QCOMPARE(setting(u"Commands"_s, u"NewGameInstalled"_s), u"0"_s);
+        QVERIFY(captionsOf(window->ListView1()).contains(u"fresh"_s));
     }
 
     void installWithoutTheServiceReportsTheFailure()
     {
-        const QString package = m_env->path(QStringLiteral("personal/Downloads/racer.bvxpak"));
-        QVERIFY(WriteFile(package, QByteArrayLiteral("PK")));
+        const QString package = m_env->path(u"personal/Downloads/racer.bvxpak"_s);
+        QVERIFY(WriteFile(package, "PK"));
         auto window = openWindow();
         QSignalSpy rebuilt(window.get(), &frmMain::listRebuilt);
-        QString title;
-        QStringList filters;
-        QString directory;
-        WhenModalShows([&](QWidget* modal) {
-            auto* dialog = qobject_cast<QFileDialog*>(modal);
-            QVERIFY(dialog);
-            title = dialog->windowTitle();
-            filters = dialog->nameFilters();
-            directory = dialog->directory().absolutePath();
-            ChooseInFileDialog(dialog, package);
-        });
-        window->menuItem(QStringLiteral("mnuInstall"))->trigger();
-        QCOMPARE(title, QStringLiteral("Install game"));
-        QCOMPARE(filters, QStringList {QStringLiteral("BVXPAK files (*.bvxpak)")});
-        QCOMPARE(directory, m_env->path(QStringLiteral("personal")));
-        QCOMPARE(m_prompts.size(), 1);
-        QCOMPARE(m_prompts.first().text, QStringLiteral("There was an error! The game isn't installed!"));
-        QCOMPARE(m_prompts.first().icon, PromptIcon::Critical);
+        const DialogSeen seen = throughFileDialog(window.get(), u"mnuInstall"_s, package);
+        QCOMPARE(QStringList({seen.title, seen.folder}), QStringList({u"Install game"_s, m_env->path(u"personal"_s)}));
+        QCOMPARE(seen.filters, QStringList {u"BVXPAK files (*.bvxpak)"_s});
+        QCOMPARE(m_prompts->texts(), QStringList {u"There was an error! The game isn't installed!"_s});
+        QCOMPARE(m_prompts->prompts.first().icon, PromptIcon::Critical);
         QCOMPARE(rebuilt.count(), 0);
     }
 
     void closingStopsTheIconBuilder()
     {
         for (int i = 0; i < 300; ++i)
-            QVERIFY(WriteFile(m_env->path(QStringLiteral("commonappdata/Brimvault/Many/game%1.exe").arg(i))));
+            QVERIFY(WriteFile(m_env->path(u"commonappdata/Brimvault/Many/game%1.exe"_s.arg(i))));
         auto window = openWindow();
         QVERIFY(window->pendingIcons() > 0);
         window->close();
@@ -583,41 +429,34 @@ private Q_SLOTS:
     {
         BuildSampleLibrary(*m_env);
         auto window = openWindow();
-        waitForIcons(window.get());
-        const FormScaling::TwipsPerPixel design {15.0, 15.0};
+        QTRY_COMPARE_WITH_TIMEOUT(window->pendingIcons(), 0, 10000);
+        const int dpi = window->logicalDpiX();
         // Whatever the screen, the title keeps its designed pixels and the list its margins in twips.
-        QCOMPARE(window->Label3()->geometry(), FormScaling::TwipsToPixels(MainWindowDesign::Label3Twips, design));
-        QCOMPARE(window->ListView1()->geometry(),
-            MainWindowDesign::ListViewGeometry(window->size(), FormScaling::ScreenTwipsPerPixel(window.get())));
+        QCOMPARE(window->Label3()->geometry(), QRect(76, 8, 380, 44));
+        QCOMPARE(window->ListView1()->geometry().topLeft(), dpi == 120 ? QPoint(17, 105) : QPoint(13, 84));
         QTest::mouseClick(
             window->ListView1(), Qt::LeftButton, {}, window->ListView1()->imgN(3).geometry().center().toPoint());
 
         const QString folder = QStringLiteral(BRIMVAULT_SCREENSHOT_DIR);
         QVERIFY(QDir().mkpath(folder));
-        const int dpi = window->logicalDpiX();
-        const QString file = folder + QStringLiteral("/main-%1.png").arg(dpi);
+        const QString file = folder + u"/main-%1.png"_s.arg(dpi);
         QVERIFY(window->grab().save(file));
         QCOMPARE(QImage(file).size(), window->size() * window->devicePixelRatio());
-
-        WhenModalShows([&](QWidget* modal) {
-            modal->grab().save(folder + QStringLiteral("/languages-%1.png").arg(dpi));
-            qobject_cast<QDialog*>(modal)->reject();
-        });
-        window->menuItem(QStringLiteral("mnuLanguage"))->trigger();
-        WhenModalShows([&](QWidget* modal) {
-            modal->grab().save(folder + QStringLiteral("/about-%1.png").arg(dpi));
-            qobject_cast<QDialog*>(modal)->accept();
-        });
-        window->menuItem(QStringLiteral("mnuAbout"))->trigger();
+        for (const char* item : {"mnuLanguage", "mnuAbout"}) {
+            WhenModalShows([&](QWidget* modal) {
+                modal->grab().save(folder + u"/%1-%2.png"_s.arg(QString::fromLatin1(item + 3).toLower()).arg(dpi));
+                qobject_cast<QDialog*>(modal)->reject();
+            });
+            window->menuItem(QString::fromLatin1(item))->trigger();
+        }
         window->ShowActionsMenu();
         QTRY_VERIFY(window->mnuActions()->isVisible());
-        QVERIFY(window->mnuActions()->grab().save(folder + QStringLiteral("/actions-menu-%1.png").arg(dpi)));
+        QVERIFY(window->mnuActions()->grab().save(folder + u"/actions-menu-%1.png"_s.arg(dpi)));
         window->mnuActions()->hide();
-
-        switchTo(QStringLiteral("Brimvault_Russian.lng"));
+        modLocalizer::SwitchLanguage(m_program->path() + u"/Brimvault_Russian.lng"_s);
         window->RebuildList();
-        waitForIcons(window.get());
-        QVERIFY(window->grab().save(folder + QStringLiteral("/main-%1-russian.png").arg(dpi)));
+        QTRY_COMPARE_WITH_TIMEOUT(window->pendingIcons(), 0, 10000);
+        QVERIFY(window->grab().save(folder + u"/main-%1-russian.png"_s.arg(dpi)));
     }
 };
 

@@ -1,5 +1,5 @@
 // Closing the main window: the advertisement that is due shows, except when the session is ending.
-#include "DriveLibrary.h"
+#include "AdvertisingFiles.h"
 #include "MainWindowFixture.h"
 #include "TestEnvironment.h"
 #include "media/WebEngineStartup.h"
@@ -32,7 +32,7 @@ private Q_SLOTS:
     {
         QFETCH(bool, sessionEnds);
         QVERIFY(
-            DriveLibrary::WriteDueAdvertisement(DataFolders::ReclamaFolder(), QStringLiteral("http://ads.example")));
+            WriteDueAdvertisement(DataFolders::ReclamaFolder(), QStringLiteral("http://ads.example"), Qt::darkCyan));
         QPointer<frmMain> window = new frmMain;
         window->setAttribute(Qt::WA_DeleteOnClose);
         QSignalSpy rebuilt(window.data(), &frmMain::listRebuilt);

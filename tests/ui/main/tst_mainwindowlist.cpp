@@ -1,6 +1,8 @@
 // The main window's list after a removal or once full: the rest of the list stays as the user left it.
 #include "MainWindowFixture.h"
 #include "TestEnvironment.h"
+#include "TestFiles.h"
+#include "TestSuite.h"
 #include "support/UserPrompt.h"
 #include "ui/listview/ListElements.h"
 #include "ui/listview/SimpleListView.h"
@@ -127,5 +129,5 @@ private Q_SLOTS:
     }
 };
 
-QTEST_MAIN(TestMainWindowList)
+BV_REGISTER_TEST(TestMainWindowList);
 #include "tst_mainwindowlist.moc"

@@ -1,0 +1,155 @@
+#include "MainWindowFixture.h"
+
+#include "GamePictures.h"
+#include "TestEnvironment.h"
+#include "app/ComponentObjects.h"
+#include "catalogue/IconCacheKey.h"
+#include "store/InfoFiles.h"
+#include "store/SettingsStore.h"
+#include "store/clsFileBag.h"
+#include "support/ProgramFolder.h"
+
+#include <QApplication>
+#include <QDialog>
+#include <QDir>
+#include <QFileDialog>
+#include <QLibrary>
+#include <QPointer>
+#include <QTest>
+#include <QTimer>
+
+using namespace Brimvault;
+using namespace Qt::StringLiterals;
+
+bool RegisterQuillet()
+{
+    QLibrary library(QStringLiteral(BRIMVAULT_BIN_DIR "/Quillet"));
+    const auto registerServer = reinterpret_cast<RegisterServerFunction>(library.resolve(RegisterServerSymbol));
+    return registerServer && registerServer() == 0;
+}
+
+ProgramFolderFixture::ProgramFolderFixture(bool withLanguageFiles)
+{
+    qputenv("BRIMVAULT_PROGRAM_DIR", m_dir.path().toLocal8Bit());
+    const QDir source(QStringLiteral(BRIMVAULT_SOURCE_DIR));
+    const auto copyAll = [&](const QString& folder, const QString& pattern) {
+        const QDir from(source.filePath(folder));
+        for (const QString& name : from.entryList({pattern}, QDir::Files))
+            QFile::copy(from.filePath(name), m_dir.filePath(name));
+    };
+    if (withLanguageFiles)
+        copyAll(u"lang"_s, u"*.lng"_s);
+    copyAll(u"help"_s, u"*.html"_s);
+    QFile::copy(source.filePath(u"help/brimvault.html"_s), builtInHelpFile());
+}
+
+ProgramFolderFixture::~ProgramFolderFixture()
+{
+    qunsetenv("BRIMVAULT_PROGRAM_DIR");
+}
+
+QString ProgramFolderFixture::builtInHelpFile() const
+{
+    return m_dir.filePath(ProgramBaseName() + u".html"_s);
+}
+
+bool WriteGameInfo(const QString& gamePath, const QString& name, const QString& russianName)
+{
+    clsFileBag bag;
+    bag.SetCurrentFileName(InfoFiles::GameInfoFileName(gamePath));
+    bag.SetRecord(clsFileBag::MakeKey(u"Name"_s), name);
+    bag.SetRecord(clsFileBag::MakeKey(u"Name_RUSSIAN"_s), russianName);
+    return bag.SaveFile();
+}
+
+static bool writeIconFile(const QString& path, const QColor& color, QChar letter)
+{
+    QDir().mkpath(QFileInfo(path).absolutePath());
+    return GamePicture(color, letter).toImage().convertToFormat(QImage::Format_ARGB32).save(path, "ICO");
+}
+
+QString BuildSampleLibrary(const TestEnvironment& environment)
+{
+    // folder, file title, English name, Russian name, icon colour
+    const char* const games[][5] = {
+        {"Lines", "lines", "Color Lines", "Цветные линии", "#dc3c3c"},
+        {"Mahjong", "mahjong", "Mahjong Garden", "Сад маджонга", "#28965a"},
+        {"Sudoku", "sudoku", "Sudoku Master", "Мастер судоку", "#465ac8"},
+        {"Chess 3D", "chess3d", "Chess 3D", "Шахматы 3D", "#3c3c46"},
+        {"Klondike", "klondike", "Klondike Solitaire", "Пасьянс «Косынка»", "#c82878"},
+        {"Aquarium", "aquarium", "Aquarium", "Аквариум", "#1ea0c8"},
+        {"Street Racer", "streetracer", "Street Racer", "Уличные гонки", "#f09614"},
+        {"Jewel Match", "jewelmatch", "Jewel Match", "Самоцветы", "#963cc8"},
+        {"Air Hockey", "airhockey", "Air Hockey", "Аэрохоккей", "#1478a0"},
+    };
+    const QString gamesFolder = environment.path(u"commonappdata/Brimvault/"_s);
+    for (const auto& game : games) {
+        const QString stem = gamesFolder + QString::fromUtf8(game[0]) + u'/' + QString::fromUtf8(game[1]);
+        WriteFile(stem + u".exe"_s);
+        WriteGameInfo(stem + u".exe"_s, QString::fromUtf8(game[2]), QString::fromUtf8(game[3]));
+        writeIconFile(stem + u".ico"_s, QColor(QString::fromLatin1(game[4])), QChar::fromLatin1(game[2][0]));
+    }
+    WriteFile(gamesFolder + u"Snake/snake.exe"_s);
+    const QString cached = gamesFolder + u"Happy Farm/happyfarm.exe"_s;
+    WriteFile(cached);
+    WriteGameInfo(cached, u"Happy Farm"_s, u"Весёлая ферма"_s);
+    writeIconFile(IconCacheFile(gamesFolder + u"Icons/"_s, cached), QColor(110, 180, 40), u'F');
+    const QString movie = gamesFolder + u"Bubbles/bubbles.swf"_s;
+    WriteFile(movie, "FWS");
+    WriteGameInfo(movie, u"Bubble Shooter"_s, u"Стрелок шариками"_s);
+
+    const QString added = environment.path(u"personal/Puzzles/puzzle.exe"_s);
+    WriteFile(added);
+    writeIconFile(environment.path(u"personal/Puzzles/puzzle.ico"_s), QColor(230, 200, 40), u'P');
+    SaveSetting(AppTitle(), u"Files"_s, u"Count"_s, u"1"_s);
+    SaveSetting(AppTitle(), u"Files"_s, u"File1"_s, added);
+    SaveSetting(AppTitle(), u"FilesNames"_s, u"FileName1"_s, u"My Puzzle"_s);
+    return added;
+}
+
+void WhenModalShows(const std::function<void(QWidget*)>& act)
+{
+    auto* poll = new QTimer(qApp);
+    poll->setInterval(10);
+    auto tries = std::make_shared<int>(0);
+    QObject::connect(poll, &QTimer::timeout, qApp, [poll, act, tries] {
+        QWidget* modal = QApplication::activeModalWidget();
+        if (!modal && ++*tries < 500)
+            return;
+        poll->stop();
+        poll->deleteLater();
+        if (!modal)
+            return;
+        QPointer<QWidget> shown(modal);
+        act(modal);
+        // A dialog the test failed to close must not hang the run.
+        QTimer::singleShot(3000, qApp, [shown] {
+            if (auto* dialog = qobject_cast<QDialog*>(shown.data()); dialog && dialog->isVisible())
+                dialog->reject();
+        });
+    });
+    poll->start();
+}
+
+void ChooseInFileDialog(QWidget* fileDialog, const QString& path)
+{
+    auto* dialog = qobject_cast<QFileDialog*>(fileDialog);
+    if (!dialog)
+        return;
+    const QFileInfo chosen(path);
+    if (chosen.isDir()) {
+        // In a folder, accepting with nothing typed answers that folder.
+        dialog->setDirectory(chosen.absoluteFilePath());
+    } else {
+        dialog->setDirectory(chosen.absolutePath());
+        // The dialog leaves the name field alone while the user types in it.
+        if (QWidget* focused = dialog->focusWidget())
+            focused->clearFocus();
+        dialog->selectFile(chosen.fileName());
+    }
+    // The dialog reads folders in the background; accepting before it has the file would answer nothing.
+    const QString expected = QDir::cleanPath(chosen.absoluteFilePath());
+    for (int i = 0; i < 200 && QDir::cleanPath(dialog->selectedFiles().value(0)) != expected; ++i)
+        QTest::qWait(10);
+    static_cast<QDialog*>(dialog)->accept();
+}
