@@ -81,7 +81,9 @@ class Checker:
         self.logs = self.scratch / "logs"
         self.times_file = self.scratch / "test-times.json"
         self.planted_file = self.scratch / "planted.json"
-        self.nice = ["nice", "-n", str(args.nice)] if args.nice else []
+        # Niceness is set to the wanted level, not added to that of a caller already running under nice.
+        raise_by = args.nice - os.nice(0)
+        self.nice = ["nice", "-n", str(raise_by)] if raise_by > 0 else []
         self.env = dict(os.environ, QT_QPA_PLATFORM="offscreen")
         if shutil.which("ccache"):
             self.env.setdefault("CMAKE_CXX_COMPILER_LAUNCHER", "ccache")
