@@ -189,7 +189,8 @@ class Checker:
             if exe:
                 proc = run(["ninja", "-C", str(self.build), "-t", "inputs", exe], env=self.env)
                 inputs = set(proc.stdout.split()) if proc.returncode == 0 else set()
-            self.tests[test["name"]] = {"exe": exe, "inputs": inputs}
+            timeout = next((p["value"] for p in test.get("properties", []) if p.get("name") == "TIMEOUT"), 0)
+            self.tests[test["name"]] = {"exe": exe, "inputs": inputs, "timeout": float(timeout or 0)}
         self.say(f"{len(self.tests)} tests in the scratch build")
 
     def tests_matching(self, regex):
@@ -205,7 +206,14 @@ class Checker:
                  if t["exe"] and (t["exe"] in relinked or t["inputs"] & relinked)]
         if regex:
             names += [n for n in self.tests_matching(regex) if n not in names]
-        return sorted(names, key=lambda n: (self.times.get(n, 60.0), n))
+        return sorted(names, key=lambda n: (self.estimate(n), n))
+
+    def estimate(self, name):
+        # Until a test has passed once, a tenth of its time-out stands in for its run time.
+        if name in self.times:
+            return self.times[name]
+        timeout = self.tests.get(name, {}).get("timeout") or self.args.timeout
+        return timeout / 10
 
     def run_test(self, name, log):
         started = time.monotonic()
