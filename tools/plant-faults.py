@@ -169,8 +169,22 @@ class Checker:
             sys.exit(f"the unchanged tree does not build, see {self.logs / 'build.log'}")
         self.say(f"built in {time.monotonic() - started:.0f} s")
 
-    def ninja(self, log):
-        return run(self.nice + ["ninja", "-C", str(self.build), f"-j{self.args.jobs}"], log=log, env=self.env)
+    def ninja(self, log, targets=None):
+        return run(self.nice + ["ninja", "-C", str(self.build), f"-j{self.args.jobs}"] + (targets or []),
+                   log=log, env=self.env)
+
+    def objects_of(self, path):
+        proc = run(["ninja", "-C", str(self.build), "-t", "query", str(path)], env=self.env)
+        if proc.returncode:
+            return []
+        outputs = proc.stdout.split("outputs:", 1)
+        return [o for o in outputs[1].split() if o.endswith(".o")] if len(outputs) == 2 else []
+
+    def reached_by_file(self, path, regex):
+        names = [n for n, t in self.tests.items() if path in t["inputs"]]
+        if regex:
+            names += [n for n in self.tests_matching(regex) if n not in names]
+        return sorted(names, key=lambda n: (self.estimate(n), n))
 
     # --- which tests a fault reaches ---------------------------------------------------------------
     def load_tests(self):
@@ -192,6 +206,12 @@ class Checker:
             timeout = next((p["value"] for p in test.get("properties", []) if p.get("name") == "TIMEOUT"), 0)
             self.tests[test["name"]] = {"exe": exe, "inputs": inputs, "timeout": float(timeout or 0)}
         self.say(f"{len(self.tests)} tests in the scratch build")
+        # What tests start or load as processes and libraries: every linked target that is not a test.
+        out = run(["ninja", "-C", str(self.build), "-t", "targets", "all"], env=self.env).stdout
+        test_exes = {t["exe"] for t in self.tests.values()}
+        self.runtime_targets = sorted(
+            target for target, _, rule in (line.partition(": ") for line in out.splitlines())
+            if re.match(r"CXX_(EXECUTABLE|MODULE_LIBRARY|SHARED_LIBRARY)_LINKER", rule) and target not in test_exes)
 
     def tests_matching(self, regex):
         out = run(["ctest", "--test-dir", str(self.build), "--show-only=json-v1", "-R", regex], env=self.env)
@@ -245,18 +265,33 @@ class Checker:
         path.write_text(original.replace(fault["find"], fault["replace"]), encoding="utf-8")
         result = {"id": fid}
         try:
-            proc = self.ninja(log)
-            if proc.returncode:
-                result.update(status="BUILD-FAILED", detail=f"see {log}")
-                return result
-            relinked = set(LINK_LINE.findall(proc.stdout))
-            names = self.reached_tests(relinked, fault.get("tests"))
+            objects = self.objects_of(path)
+            if objects:
+                # Built lazily: the changed objects, the program, service and components, then each reached
+                # test just before it runs, so that a caught fault costs one or two links, not all of them.
+                proc = self.ninja(log, objects + self.runtime_targets)
+                if proc.returncode:
+                    result.update(status="BUILD-FAILED", detail=f"see {log}")
+                    return result
+                names = self.reached_by_file(str(path), fault.get("tests"))
+            else:
+                # A header: build everything and take the tests whose executables or dependencies relinked.
+                proc = self.ninja(log)
+                if proc.returncode:
+                    result.update(status="BUILD-FAILED", detail=f"see {log}")
+                    return result
+                names = self.reached_tests(set(LINK_LINE.findall(proc.stdout)), fault.get("tests"))
             result["tests"] = names
             if not names:
                 result.update(status="MISSED", detail="no test reaches this code")
                 return result
             caught, ran = [], 0
             for name in names:
+                exe = self.tests.get(name, {}).get("exe")
+                proc = self.ninja(log, [exe] if exe else None)
+                if proc.returncode:
+                    result.update(status="BUILD-FAILED", detail=f"{exe or 'the tree'} does not link, see {log}")
+                    return result
                 passed, took = self.run_test(name, log)
                 ran += 1
                 if passed is None:
