@@ -361,8 +361,8 @@ def main():
     parser = argparse.ArgumentParser(prog="plant-faults.sh", description=(
         "Plants each fault of the list alone in a scratch copy of the source tree "
         "(<scratch-root>/plant-scratch-<name>, reused between runs), rebuilds it with ninja, runs the tests "
-        "whose executables or run-time dependencies were relinked (cheapest first, stopping at the first "
-        "failure) and reports CAUGHT, MISSED or BUILD-FAILED for each."))
+        "built from the changed file, directly or through the program, service and components they start "
+        "(cheapest first, stopping at the first failure) and reports CAUGHT, MISSED or BUILD-FAILED for each."))
     parser.add_argument("--tool-dir", help=argparse.SUPPRESS, default=str(Path(__file__).resolve().parent))
     parser.add_argument("--source", help="source tree to copy (default: the repository holding this tool)")
     parser.add_argument("--list", help="fault list (default: faults.list beside this tool)")
