@@ -3,7 +3,7 @@ BUILD ?= build
 CMAKE_FLAGS ?=
 CTEST_FLAGS ?= --output-on-failure
 
-.PHONY: all deps configure build run test bench format format-check fuzz-smoke windows-check package test-package clean
+.PHONY: all deps configure build run test bench plant-faults format format-check fuzz-smoke windows-check package test-package clean
 
 all: build
 
@@ -27,6 +27,10 @@ test: build
 
 bench: build
 	@if [ -x tools/run-bench.sh ]; then tools/run-bench.sh $(BUILD); else echo "no benchmarks yet"; fi
+
+# Plants each fault of tools/faults.list in a scratch copy and reports which ones the tests catch.
+plant-faults:
+	tools/plant-faults.sh $(PLANT_FLAGS)
 
 format: configure
 	cmake --build $(BUILD) --target format
