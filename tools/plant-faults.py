@@ -73,7 +73,8 @@ class Checker:
     def __init__(self, args):
         self.args = args
         self.source = Path(args.source).resolve()
-        self.scratch = Path(args.scratch_root) / f"plant-scratch-{args.name or self.source.name}"
+        root = Path(args.scratch_root) if args.scratch_root else self.source.parent
+        self.scratch = root / f"plant-scratch-{args.name or self.source.name}"
         self.tree = self.scratch / "tree"
         # The build lies inside the tree, as in a checkout, so that the shared compiler cache (paths taken
         # relative to the build folder) hits for objects built elsewhere from the same sources.
@@ -369,7 +370,7 @@ def main():
     parser.add_argument("--only", help="comma-separated fault ids to plant")
     parser.add_argument("--report", help="also write the report to this file")
     parser.add_argument("--name", help="scratch folder name suffix (default: the source folder's name)")
-    parser.add_argument("--scratch-root", default="/work", help="where scratch folders go (default /work)")
+    parser.add_argument("--scratch-root", help="where scratch folders go (default: beside the source tree)")
     parser.add_argument("--jobs", type=int, default=2, help="ninja jobs (default 2)")
     parser.add_argument("--nice", type=int, default=10, help="niceness of builds and tests (default 10, 0: none)")
     parser.add_argument("--timeout", type=int, default=300,
