@@ -1,8 +1,8 @@
-# brimvault_add_test(tst_name SOURCES a.cpp ... LIBS lib ... [LABELS l ...])
+# brimvault_add_test(tst_name SOURCES a.cpp ... LIBS lib ... [LABELS l ...] [LAUNCHER command ...])
 # Every test is its own Qt Test executable, registered with CTest, run headless with its own temporary
 # environment so that nothing touches the real user's settings or folders.
 function(brimvault_add_test name)
-    cmake_parse_arguments(T "" "TIMEOUT" "SOURCES;LIBS;LABELS;ENV" ${ARGN})
+    cmake_parse_arguments(T "" "TIMEOUT" "SOURCES;LIBS;LABELS;ENV;LAUNCHER" ${ARGN})
     add_executable(${name} ${T_SOURCES})
     target_link_libraries(${name} PRIVATE brimvault_common Qt6::Test bv_testsupport ${T_LIBS})
     target_include_directories(${name} PRIVATE ${CMAKE_SOURCE_DIR}/tests/common)
@@ -11,7 +11,7 @@ function(brimvault_add_test name)
         BRIMVAULT_BIN_DIR="${BRIMVAULT_BIN_DIR}"
         BRIMVAULT_SOURCE_DIR="${CMAKE_SOURCE_DIR}"
         BRIMVAULT_TEST_DATA_DIR="${CMAKE_BINARY_DIR}/testdata")
-    add_test(NAME ${name} COMMAND ${name})
+    add_test(NAME ${name} COMMAND ${T_LAUNCHER} $<TARGET_FILE:${name}>)
     if(NOT T_TIMEOUT)
         set(T_TIMEOUT 120)
     endif()

@@ -16,6 +16,7 @@ SimpleListView::SimpleListView(QWidget* parent)
     , m_wrapper(font())
     , m_backColor(QColor::fromRgb(ListGrid::colorFromStored(ListGrid::DefaultBackColorValue)))
 {
+    installAccessibility();
     setAttribute(Qt::WA_OpaquePaintEvent);
     setFocusPolicy(Qt::StrongFocus);
     setMouseTracking(true);

@@ -10,6 +10,7 @@
 #include <QWidget>
 
 class QMimeData;
+class QPainter;
 class QScrollBar;
 class QTimer;
 
@@ -66,6 +67,20 @@ public:
     QScrollBar* vbarWindow() const { return m_vbar; }
     QTimer* Timer1() const { return m_timer; }
 
+    // Assistive technology and the keyboard. An item is shown unless a filter hides it; a filter calls
+    // shownItemsChanged() after changing what is shown, so that readers list the items again.
+    bool isItemShown(int index) const;
+    void shownItemsChanged();
+    quint64 shownRevision() const { return m_shownRevision; }
+    // The selected item, or -1 when none is selected or it is not shown.
+    int currentItem() const;
+    QRect itemRect(int index) const;
+    // Selects the item and raises EnterKey with its data string, as Enter does.
+    void activateItem(int index);
+    void focusItem(int index);
+    // The dashed focus mark around the current item, shown while the list has the focus after keyboard use.
+    bool showsFocusMark() const;
+
 Q_SIGNALS:
     // Arguments passed by reference may be changed by a directly connected host: an Effect of 0 refuses a
     // drop (1 copy, 2 move, 4 link). Button: 1 left, 2 right, 4 middle; Shift: 1 shift, 2 control, 4 alt.
@@ -85,6 +100,8 @@ Q_SIGNALS:
     void propertyChanged(const QString& name);
 
 protected:
+    bool event(QEvent* event) override;
+    void focusInEvent(QFocusEvent* event) override;
     void paintEvent(QPaintEvent* event) override;
     void resizeEvent(QResizeEvent* event) override;
     void showEvent(QShowEvent* event) override;
@@ -103,6 +120,7 @@ protected:
 private:
     friend class ListIcon;
     friend class ListCaption;
+    friend class SimpleListViewAccessible;
 
     struct Hit {
         int index = -1;
@@ -129,6 +147,12 @@ private:
     QRect itemArea() const;
     const std::vector<int>& itemsNear(double shownTop, double shownBottom) const;
 
+    // Focus and assistive technology
+    static void installAccessibility();
+    void notifyAccessibleFocus();
+    void setKeyboardCues(bool shown);
+    void paintFocusMark(QPainter& painter) const;
+
     // Selection and input
     ListError selectItem(int index);
     void onHighlightTimeout();
@@ -150,6 +174,8 @@ private:
     int m_oleDropMode = 0;
     Hit m_capture;
     int m_wheelRemainder = 0;
+    bool m_keyboardCues = false;
+    quint64 m_shownRevision = 0;
 };
 
 } // namespace Brimvault

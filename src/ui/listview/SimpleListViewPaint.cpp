@@ -55,6 +55,7 @@ void SimpleListView::paintEvent(QPaintEvent* event)
     }
     if (m_model.isLoaded(current))
         drawIcon(m_model.at(current));
+    paintFocusMark(painter);
 }
 
 } // namespace Brimvault
