@@ -30,6 +30,8 @@ frmLanguages::frmLanguages(QWidget* parent)
     m_cbLanguages->setObjectName(QStringLiteral("cbLanguages"));
     m_cbLanguages->setMinimumWidth(260);
     m_labLanguages->setBuddy(m_cbLanguages);
+    // The choice is the dialog's one question: the keyboard starts there.
+    m_cbLanguages->setFocus();
 
     auto* buttons = new QDialogButtonBox(this);
     m_cmdOK = buttons->addButton(QString(), QDialogButtonBox::AcceptRole);

@@ -49,6 +49,7 @@ frmReclama::frmReclama(QWidget* parent)
 
     m_goBack = new QToolButton(this);
     m_goBack->setObjectName(QStringLiteral("pbGoBack"));
+    m_goBack->setAccessibleName(tr("Back"));
     m_goBack->setIcon(style()->standardIcon(QStyle::SP_ArrowBack));
     m_goBack->setAutoRaise(true);
     m_goBack->setFocusPolicy(Qt::NoFocus);

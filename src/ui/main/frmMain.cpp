@@ -52,6 +52,7 @@ frmMain::frmMain(QWidget* parent)
     createMenus();
     connectGameActions();
     connectMediaHost();
+    createKeyboardMenus();
     placeControls();
     connect(qGuiApp, &QGuiApplication::commitDataRequest, this, &frmMain::sessionEnding, Qt::DirectConnection);
 
@@ -159,6 +160,7 @@ void frmMain::ChangeLocalizeCaptions()
     using modLocalizer::Translate;
     const QString productName = Translate(1020, AppTitle());
     m_labActions->setText(Translate(1010, QStringLiteral("Actions")));
+    m_imgActions->setAccessibleName(m_labActions->text());
     m_label2->setText(productName);
     m_label3->setText(productName);
     m_label4->setText(Translate(690));

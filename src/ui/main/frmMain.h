@@ -58,6 +58,10 @@ public:
     void mnuRenameGameClick();
     // Shows mnuActions at the pointer, as a click on the Actions button does.
     void ShowActionsMenu();
+    // The keyboard's ways to the menus: mnuActions under the Actions button, mnuItemPopup at the current icon,
+    // each with its first item active.
+    void showActionsMenuFromKeyboard();
+    void showItemMenuFromKeyboard();
 
     SimpleListView* ListView1() const { return m_listView; }
     QLabel* Label2() const { return m_label2; }
@@ -104,6 +108,7 @@ private:
     void connectGameActions();
     void captionMenus();
     void connectMediaHost();
+    void createKeyboardMenus();
 
     // Every close runs this once: the closing flag stops discovery and the icon builder, then the advertisement
     // that is due shows when the mode allows one.

@@ -1,0 +1,182 @@
+// The main window driven by the keyboard alone: both menus open from keys at a sensible place, every command
+// is reached with the arrow keys, and a dialog opened that way is used and closed without a mouse.
+#include "MainWindowFixture.h"
+#include "PromptRecorder.h"
+#include "TestEnvironment.h"
+#include "TestSuite.h"
+
+#include "i18n/frmLanguages.h"
+#include "ui/listview/ListElements.h"
+#include "ui/listview/SimpleListView.h"
+#include "ui/main/ClickLabel.h"
+#include "ui/main/frmMain.h"
+
+#include <QAccessible>
+#include <QAccessibleActionInterface>
+#include <QAction>
+#include <QComboBox>
+#include <QKeyEvent>
+#include <QMenu>
+#include <QSignalSpy>
+#include <QTest>
+
+using namespace Brimvault;
+using namespace Qt::StringLiterals;
+
+namespace {
+
+QStringList activeActionsWalkingDown(QMenu* menu)
+{
+    QStringList seen;
+    while (menu->activeAction() && !seen.contains(menu->activeAction()->objectName())) {
+        seen << menu->activeAction()->objectName();
+        QTest::keyClick(menu, Qt::Key_Down);
+    }
+    return seen;
+}
+
+} // namespace
+
+class TestKeyboardOnly : public QObject {
+    Q_OBJECT
+
+    TestEnvironment m_env;
+    ProgramFolderFixture m_program {true};
+    PromptRecorder m_prompts;
+    std::unique_ptr<frmMain> m_window;
+
+    SimpleListView* list() const { return m_window->ListView1(); }
+
+    void press(const QString& keys)
+    {
+        if (keys.startsWith(u"Alt"_s)) {
+            QKeyEvent altDown(QEvent::KeyPress, Qt::Key_Alt, Qt::AltModifier);
+            QApplication::sendEvent(list(), &altDown);
+            if (keys == u"Alt+Left"_s)
+                QTest::keyClick(list(), Qt::Key_Left, Qt::AltModifier);
+            QKeyEvent altUp(QEvent::KeyRelease, Qt::Key_Alt, Qt::NoModifier);
+            QApplication::sendEvent(list(), &altUp);
+        } else {
+            const QKeyCombination combination = QKeySequence(keys)[0];
+            QTest::keyClick(list(), combination.key(), combination.keyboardModifiers());
+        }
+    }
+
+private Q_SLOTS:
+    void initTestCase() { BuildSampleLibrary(m_env); }
+
+    void init()
+    {
+        m_window = std::make_unique<frmMain>();
+        QSignalSpy rebuilt(m_window.get(), &frmMain::listRebuilt);
+        m_window->show();
+        QVERIFY(rebuilt.wait(10000));
+        m_window->activateWindow();
+        QVERIFY(QTest::qWaitForWindowActive(m_window.get()));
+        list()->setFocus();
+        list()->InitSelection();
+        QTest::keyClick(list(), Qt::Key_Right);
+    }
+
+    void cleanup()
+    {
+        for (QMenu* menu : {m_window->mnuActions(), m_window->mnuItemPopup()})
+            menu->hide();
+        m_window.reset();
+    }
+
+    void keysOpenTheMenus_data()
+    {
+        QTest::addColumn<QString>("keys");
+        QTest::addColumn<QString>("menu");
+        QTest::addColumn<QString>("first");
+        QTest::newRow("F10") << u"F10"_s << u"mnuActions"_s << u"mnuAddFile"_s;
+        QTest::newRow("Alt alone") << u"Alt"_s << u"mnuActions"_s << u"mnuAddFile"_s;
+        QTest::newRow("Alt with an arrow") << u"Alt+Left"_s << QString() << QString();
+        QTest::newRow("Shift+F10") << u"Shift+F10"_s << u"mnuItemPopup"_s << u"mnuOpenGame"_s;
+        QTest::newRow("menu key") << u"Menu"_s << u"mnuItemPopup"_s << u"mnuOpenGame"_s;
+    }
+    void keysOpenTheMenus()
+    {
+        QFETCH(QString, keys);
+        QFETCH(QString, menu);
+        QFETCH(QString, first);
+        press(keys);
+        QMenu* actions = m_window->mnuActions();
+        QMenu* item = m_window->mnuItemPopup();
+        QCOMPARE(actions->isVisible(), menu == u"mnuActions"_s);
+        QCOMPARE(item->isVisible(), menu == u"mnuItemPopup"_s);
+        if (menu.isEmpty())
+            return;
+        QMenu* shown = menu == u"mnuActions"_s ? actions : item;
+        QCOMPARE(shown->activeAction()->objectName(), first);
+        // The Actions menu hangs under its button; the item menu opens on the current game's icon.
+        const QPoint at = shown == actions
+            ? m_window->imgActions()->mapToGlobal(QPoint(0, m_window->imgActions()->height()))
+            : list()->mapToGlobal(list()->imgN(1).geometry().center().toPoint());
+        // A menu that would leave the screen on the right moves left.
+        QCOMPARE(shown->pos().y(), at.y());
+        QVERIFY(shown->pos().x() <= at.x() && shown->geometry().right() >= at.x());
+    }
+
+    void arrowKeysReachEveryCommand_data()
+    {
+        QTest::addColumn<QString>("keys");
+        QTest::addColumn<QStringList>("commands");
+        QTest::newRow("actions") << u"F10"_s
+                                 << QStringList {u"mnuAddFile"_s, u"mnuAddFolder"_s, u"mnuInstall"_s,
+                                        u"mnuGetMoreGames"_s, u"mnuActionRemoveFile"_s, u"mnuActionRemoveAllFiles"_s,
+                                        u"mnuLanguage"_s, u"mnuHelp"_s, u"mnuAbout"_s};
+        QTest::newRow("item") << u"Shift+F10"_s
+                              << QStringList {u"mnuOpenGame"_s, u"mnuRenameGame"_s, u"mnuRemoveFile"_s};
+    }
+    void arrowKeysReachEveryCommand()
+    {
+        QFETCH(QString, keys);
+        QFETCH(QStringList, commands);
+        press(keys);
+        QMenu* menu = keys == u"F10"_s ? m_window->mnuActions() : m_window->mnuItemPopup();
+        QCOMPARE(activeActionsWalkingDown(menu), commands);
+        QTest::keyClick(menu, Qt::Key_Escape);
+        QVERIFY(!menu->isVisible());
+    }
+
+    void languageDialogRunsFromKeysAlone()
+    {
+        press(u"F10"_s);
+        QMenu* menu = m_window->mnuActions();
+        while (menu->activeAction()->objectName() != u"mnuLanguage"_s)
+            QTest::keyClick(menu, Qt::Key_Down);
+        QString seenTitle;
+        bool comboHadFocus = false;
+        WhenModalShows([&](QWidget* modal) {
+            seenTitle = modal->windowTitle();
+            comboHadFocus = qobject_cast<QComboBox*>(modal->focusWidget()) != nullptr;
+            QTest::keyClick(modal, Qt::Key_Escape);
+        });
+        QSignalSpy rebuilt(m_window.get(), &frmMain::listRebuilt);
+        QTest::keyClick(menu, Qt::Key_Return);
+        QVERIFY(rebuilt.count() > 0 || rebuilt.wait(10000));
+        QCOMPARE(seenTitle, u"Program language"_s);
+        QVERIFY(comboHadFocus);
+    }
+
+    void actionsButtonIsANamedButton()
+    {
+        QAccessibleInterface* button = QAccessible::queryAccessibleInterface(m_window->imgActions());
+        QCOMPARE(button->role(), QAccessible::Button);
+        QCOMPARE(button->text(QAccessible::Name), u"Actions"_s);
+        button->actionInterface()->doAction(QAccessibleActionInterface::pressAction());
+        QVERIFY(m_window->mnuActions()->isVisible());
+    }
+};
+
+BV_REGISTER_TEST(TestKeyboardOnly);
+
+// The window as a keyboard and screen-reader user meets it; TestScreenIcons also runs alone at 200%.
+int main(int argc, char** argv)
+{
+    return RunRegisteredTests(argc, argv);
+}
+
+#include "tst_keyboardonly.moc"
