@@ -41,7 +41,7 @@ IconCacheBuilder::Result IconCacheBuilder::BuildIcon(const QString& path) const
         cFileIcon cached;
         // Anything but a regular file in the cache file's place (a pipe would block the window) is no cache.
         if (!cacheFile.isEmpty() && QFileInfo(cacheFile).isFile() && cached.LoadIcon(cacheFile)) {
-            result.picture = cached.BestIconPicture();
+            result.picture = cached.ScreenIconPicture();
             if (!result.picture.isNull()) {
                 result.outcome = Outcome::FromCache;
                 return result;
@@ -70,7 +70,7 @@ IconCacheBuilder::Result IconCacheBuilder::BuildIcon(const QString& path) const
             result.saved = false;
         }
     }
-    result.picture = icon.BestIconPicture();
+    result.picture = icon.ScreenIconPicture();
     result.outcome = result.picture.isNull() ? Outcome::NoIcon : Outcome::Extracted;
     return result;
 }

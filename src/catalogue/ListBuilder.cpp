@@ -32,7 +32,7 @@ QImage pictureOf(const QString& iconFile)
         cFileIcon icon;
         if (!icon.LoadIcon(FileSystemPath(iconFile)))
             return {};
-        return icon.BestIconPicture();
+        return icon.ScreenIconPicture();
     } catch (const NumberedError&) {
         return {};
     }

@@ -57,6 +57,9 @@ public:
 
     // The image that suits a 32-pixel cell on the display, composed with its transparency; null when none.
     QImage BestIconPicture();
+    // The same on a screen of more device pixels than units: the image that fills the cell's real pixels,
+    // with that pixel ratio; BestIconPicture's choice on an ordinary screen.
+    QImage ScreenIconPicture();
     QImage IconPicture(int nIndex) const;
     // Colour bits and AND mask composed into one picture with transparency; null on failure.
     QImage IconHandle(int nIndex) const;
@@ -65,6 +68,9 @@ public:
 
     // The choice BestIconPicture makes for a display of the given depth.
     int bestIconIndex(int wantedDepth) const;
+    // The smallest image at least wantedPixels wide (else the widest), nearest in depth among equals; 0 if none.
+    int sharpIconIndex(int wantedPixels, int wantedDepth) const;
+    static qreal displayPixelRatio();
     // Bits per pixel of the display, asked once per object: the primary screen's, or 32 without one.
     int displayDepth();
     // Why the last LoadIcon failed (not shown to anyone; kept for diagnostics and tests).

@@ -1,5 +1,6 @@
 #include "ui/main/StockPictures.h"
 
+#include <QGuiApplication>
 #include <QIcon>
 #include <QLinearGradient>
 #include <QPainter>
@@ -15,10 +16,12 @@ namespace Brimvault::StockPictures {
 
 namespace {
 
-// Every picture is drawn on a 32-unit canvas and scaled to the size asked for.
+// Every picture is drawn on a 32-unit canvas and scaled to the size asked for, in the screen's real pixels.
 QPixmap drawn(int size, const std::function<void(QPainter&)>& draw)
 {
-    QPixmap picture(size, size);
+    const qreal ratio = qApp ? qApp->devicePixelRatio() : 1.0;
+    QPixmap picture(QSize(size, size) * ratio);
+    picture.setDevicePixelRatio(ratio);
     picture.fill(Qt::transparent);
     QPainter painter(&picture);
     painter.setRenderHint(QPainter::Antialiasing);
