@@ -5,6 +5,7 @@
 #include "ui/listview/SimpleListView.h"
 #include "ui/main/ClickLabel.h"
 #include "ui/main/KeyboardMenus.h"
+#include "ui/main/WindowAccessible.h"
 
 #include <QAction>
 #include <QMenu>
@@ -28,6 +29,7 @@ void popupWithFirstItem(QMenu* menu, const QPoint& at)
 
 void frmMain::createKeyboardMenus()
 {
+    InstallWindowAccessibility();
     new KeyboardMenus(
         this, [this] { showActionsMenuFromKeyboard(); }, [this] { showItemMenuFromKeyboard(); });
 }

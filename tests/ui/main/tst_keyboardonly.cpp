@@ -161,8 +161,11 @@ private Q_SLOTS:
         QVERIFY(comboHadFocus);
     }
 
-    void actionsButtonIsANamedButton()
+    void windowAndActionsButtonAreNamed()
     {
+        QAccessibleInterface* window = QAccessible::queryAccessibleInterface(m_window.get());
+        QCOMPARE(window->role(), QAccessible::Window);
+        QCOMPARE(window->text(QAccessible::Name), u"Brimvault"_s);
         QAccessibleInterface* button = QAccessible::queryAccessibleInterface(m_window->imgActions());
         QCOMPARE(button->role(), QAccessible::Button);
         QCOMPARE(button->text(QAccessible::Name), u"Actions"_s);
