@@ -6,6 +6,7 @@ packages=(
     cmake ninja-build g++ pkg-config
     qt6-base-dev qt6-webengine-dev libqt6webenginecore6-bin qt6-image-formats-plugins libgl-dev
     libarchive-dev xvfb xauth xdotool libxcb1-dev unzip
+    at-spi2-core dbus-daemon dbus-bin python3-pyatspi
     mingw-w64 icoutils python3-pefile
     clang libclang-rt-14-dev clang-format
     desktop-file-utils appstream librsvg2-bin
