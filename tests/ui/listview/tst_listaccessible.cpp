@@ -1,7 +1,6 @@
 // The icon list as a screen reader and a keyboard user meet it: its items through Qt's accessibility layer,
 // the focus events arrow keys raise, and the focus mark.
 #include "GamePictures.h"
-#include "TestEnvironment.h"
 
 #include "ui/listview/ListElements.h"
 #include "ui/listview/SimpleListView.h"
@@ -60,8 +59,6 @@ QSet<QRgb> frameEdgeColours(SimpleListView& list)
 
 class TestListAccessible : public QObject {
     Q_OBJECT
-
-    TestEnvironment m_environment;
 
 private Q_SLOTS:
     void initTestCase()
