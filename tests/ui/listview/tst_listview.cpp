@@ -221,7 +221,7 @@ private Q_SLOTS:
 
     void longListFindsEveryClickAndScrollsToItsLastGame()
     {
-        auto list = shownList(283, 250, 0);
+        auto list = shownList(283, 900, 0);
         QVERIFY(list);
         for (int i = 0; i < 20000; ++i)
             list->AddEx(captionFor(i), dataFor(i));
@@ -232,13 +232,14 @@ private Q_SLOTS:
             QTest::mouseClick(list.get(), Qt::LeftButton, {}, iconAt(*list, index));
             QCOMPARE(list->currentIndex(), index);
         }
-        // A caption that grew is found below its old bottom, while the grid stays as it was.
+        // A caption that grew taller than a band is found at its far end, while the grid stays as it was.
         const qreal nextRow = list->imgN(186).geometry().top();
-        list->SetCurrentCaption(u"A caption long enough to wrap over many many lines of the grid"_s);
+        list->SetCurrentCaption(u"word "_s.repeated(60));
         QCOMPARE(list->imgN(186).geometry().top(), nextRow);
         QTest::mouseClick(list.get(), Qt::LeftButton, {}, iconAt(*list, 181));
-        QTest::mouseClick(
-            list.get(), Qt::LeftButton, {}, QPoint(int(list->labN(183).geometry().left()) + 2, nextRow - 5));
+        const QRectF grown = list->labN(183).geometry();
+        QVERIFY(grown.height() > 300);
+        QTest::mouseClick(list.get(), Qt::LeftButton, {}, QPoint(int(grown.left()) + 2, int(grown.bottom()) - 2));
         QCOMPARE(list->currentIndex(), 183);
         bar->setValue(bar->maximum());
         QTest::mouseClick(list.get(), Qt::LeftButton, {}, iconAt(*list, 19999));

@@ -288,8 +288,7 @@ private Q_SLOTS:
         QCOMPARE(closing.count(), 1);
     }
 
-    // Whatever the screen, the window opens centred, the title keeps its designed pixels and the list its
-    // margins in twips.
+    // Whatever the screen: centred, the title in its designed pixels, the list at its margins in twips.
     void placesFollowTheScreen()
     {
         auto window = openWindow();
