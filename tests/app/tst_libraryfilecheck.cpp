@@ -1,5 +1,5 @@
-// Component files are checked before the system's loader sees them: a cut-off library would be mapped
-// without complaint and kill the program with a bus error once its missing part runs.
+// A cut-off library would be mapped without complaint and kill the program with a bus error once its missing
+// part runs, so component files are checked before the system's loader sees them.
 #include "app/LibraryFileCheck.h"
 
 #include "TestEnvironment.h"
@@ -22,52 +22,31 @@ private Q_SLOTS:
         REQUIRE_FIXTURE(m_library.size() > 4096, "Velloran.so (the Velloran target)");
     }
 
+    // Missing, empty, text, cut-off and folder files are met by the real program in the damaged-environment runs.
     void libraryFiles_data()
     {
         QTest::addColumn<QByteArray>("bytes");
         QTest::addColumn<bool>("loadable");
-        const QByteArray library = m_library;
-        QTest::newRow("complete library") << library << true;
-        QTest::newRow("empty") << QByteArray() << false;
-        QTest::newRow("text") << QByteArray("not a library\n") << false;
-        QTest::newRow("ELF magic only") << QByteArray("\x7f"
-                                                      "ELF")
-                                        << false;
-        QTest::newRow("ELF header only") << library.left(64) << false;
-        QTest::newRow("cut off at half") << library.left(library.size() / 2) << false;
-        QTest::newRow("cut off one byte short") << library.chopped(1) << false;
+        QTest::newRow("complete library") << m_library << true;
+        QTest::newRow("cut off one byte short") << m_library.chopped(1) << false;
         // Bytes 4 (word size), 16 (file type), 32 to 39 (program header offset), 56 and 57 (their count).
-        QByteArray damaged = library;
-        damaged[4] = damaged[4] == 2 ? 1 : 2;
-        QTest::newRow("other word size") << damaged << false;
-        damaged = library;
-        damaged[16] = 2;
-        QTest::newRow("an executable, not a library") << damaged << false;
-        damaged = library;
-        damaged.replace(32, 8, QByteArray(8, '\x7f'));
-        QTest::newRow("program headers beyond the end") << damaged << false;
-        damaged = library;
-        damaged.replace(56, 2, "\xff\xff");
-        QTest::newRow("more program headers than the file holds") << damaged << false;
+        const auto damaged = [&](qsizetype at, const QByteArray& bytes) {
+            return QByteArray(m_library).replace(at, bytes.size(), bytes);
+        };
+        QTest::newRow("other word size") << damaged(4, QByteArray(1, m_library[4] == 2 ? 1 : 2)) << false;
+        QTest::newRow("an executable, not a library") << damaged(16, "\x02") << false;
+        QTest::newRow("program headers beyond the end") << damaged(32, QByteArray(8, '\x7f')) << false;
+        QTest::newRow("more program headers than the file holds") << damaged(56, "\xff\xff") << false;
     }
     void libraryFiles()
     {
         QFETCH(QByteArray, bytes);
-        QFETCH(bool, loadable);
         TestEnvironment env;
         const QString path = env.path(QStringLiteral("Velloran.so"));
         QVERIFY(WriteFile(path, bytes));
         const std::optional<QString> problem = LibraryFileProblem(path);
-        QCOMPARE(!problem.has_value(), loadable);
-        if (problem)
-            QVERIFY2(problem->contains(path), qPrintable(*problem));
-    }
-
-    void notAFile()
-    {
-        TestEnvironment env;
-        QVERIFY(LibraryFileProblem(env.path(QStringLiteral("missing.so"))).has_value());
-        QVERIFY(LibraryFileProblem(env.root()).has_value());
+        QTEST(!problem.has_value(), "loadable");
+        QVERIFY(!problem || problem->contains(path));
     }
 
 private:

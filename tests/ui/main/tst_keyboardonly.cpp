@@ -155,10 +155,4 @@ private Q_SLOTS:
 
 BV_REGISTER_TEST(TestKeyboardOnly);
 
-// The window as a keyboard and screen-reader user meets it; TestScreenIcons also runs alone at 200%.
-int main(int argc, char** argv)
-{
-    return RunRegisteredTests(argc, argv);
-}
-
 #include "tst_keyboardonly.moc"
