@@ -17,43 +17,20 @@
 #include <QtTest>
 
 using namespace Brimvault;
+using namespace Qt::StringLiterals;
 
 Q_DECLARE_METATYPE(Brimvault::PromptIcon)
 Q_DECLARE_METATYPE(Brimvault::PromptButtons)
 Q_DECLARE_METATYPE(Brimvault::PromptAnswer)
 
-namespace {
-
-QList<QJsonObject> logged(const QString& log)
-{
-    QList<QJsonObject> entries;
-    for (const QByteArray& line : ReadFile(log).split('\n')) {
-        if (!line.isEmpty())
-            entries.append(QJsonDocument::fromJson(line).object());
-    }
-    return entries;
-}
-
-} // namespace
-
 class TestPrompts : public QObject {
     Q_OBJECT
-    std::unique_ptr<TestEnvironment> m_env;
-    QString m_log;
-
 private Q_SLOTS:
-    void init()
-    {
-        m_env = std::make_unique<TestEnvironment>();
-        m_log = m_env->path(QStringLiteral("prompts.jsonl"));
-    }
-
     void cleanup()
     {
         SetPromptHandler({});
         SetInputHandler({});
         qunsetenv("BRIMVAULT_PROMPT_LOG");
-        m_env.reset();
     }
 
     void promptLog_data()
@@ -61,47 +38,37 @@ private Q_SLOTS:
         QTest::addColumn<PromptIcon>("icon");
         QTest::addColumn<PromptButtons>("buttons");
         QTest::addColumn<PromptAnswer>("answer");
-        QTest::addColumn<QString>("iconName");
-        QTest::addColumn<QString>("buttonsName");
-
-        QTest::newRow("OK only") << PromptIcon::Critical << PromptButtons::Ok << PromptAnswer::Ok
-                                 << QStringLiteral("critical") << QStringLiteral("ok");
+        QTest::addColumn<QString>("logged"); // icon and buttons as the log names them
+        QTest::newRow("OK only") << PromptIcon::Critical << PromptButtons::Ok << PromptAnswer::Ok << u"critical ok"_s;
         QTest::newRow("OK/Cancel") << PromptIcon::Exclamation << PromptButtons::OkCancel << PromptAnswer::Cancel
-                                   << QStringLiteral("exclamation") << QStringLiteral("okcancel");
+                                   << u"exclamation okcancel"_s;
         QTest::newRow("Yes/No") << PromptIcon::Question << PromptButtons::YesNo << PromptAnswer::No
-                                << QStringLiteral("question") << QStringLiteral("yesno");
+                                << u"question yesno"_s;
         QTest::newRow("Yes/No/Cancel") << PromptIcon::None << PromptButtons::YesNoCancel << PromptAnswer::Cancel
-                                       << QStringLiteral("none") << QStringLiteral("yesnocancel");
+                                       << u"none yesnocancel"_s;
     }
-
     void promptLog()
     {
         QFETCH(PromptIcon, icon);
         QFETCH(PromptButtons, buttons);
-        QFETCH(PromptAnswer, answer);
-        QFETCH(QString, iconName);
-        QFETCH(QString, buttonsName);
-
+        TestEnvironment env;
+        const QString log = env.path(u"prompts.jsonl"_s);
         QVERIFY(!TestHooks::InstallPromptLogIfRequested());
-        qputenv("BRIMVAULT_PROMPT_LOG", m_log.toLocal8Bit());
+        qputenv("BRIMVAULT_PROMPT_LOG", log.toLocal8Bit());
         QVERIFY(TestHooks::InstallPromptLogIfRequested());
 
-        const QString text = QStringLiteral("Remove \"Chess\"?\nReally?");
-        QCOMPARE(ShowPrompt({text, QStringLiteral("Brimvault"), icon, buttons}), answer);
-        QCOMPARE(ShowPrompt({QStringLiteral("second"), QString(), icon, buttons}), answer);
-        QCOMPARE(AskInput({QStringLiteral("Edit game name"), QStringLiteral("Brimvault"), QStringLiteral("Chess")}),
-            std::nullopt);
+        QTEST(ShowPrompt({u"Remove \"Chess\"?\nReally?"_s, u"Brimvault"_s, icon, buttons}), "answer");
+        QCOMPARE(AskInput({u"Edit game name"_s, u"Brimvault"_s, u"Chess"_s}), std::nullopt);
 
-        const QList<QJsonObject> entries = logged(m_log);
-        QCOMPARE(entries.size(), 3);
-        QCOMPARE(entries[0].value(QStringLiteral("kind")).toString(), QStringLiteral("message"));
-        QCOMPARE(entries[0].value(QStringLiteral("text")).toString(), text);
-        QCOMPARE(entries[0].value(QStringLiteral("title")).toString(), QStringLiteral("Brimvault"));
-        QCOMPARE(entries[0].value(QStringLiteral("icon")).toString(), iconName);
-        QCOMPARE(entries[0].value(QStringLiteral("buttons")).toString(), buttonsName);
-        QCOMPARE(entries[1].value(QStringLiteral("text")).toString(), QStringLiteral("second"));
-        QCOMPARE(entries[2].value(QStringLiteral("kind")).toString(), QStringLiteral("input"));
-        QCOMPARE(entries[2].value(QStringLiteral("text")).toString(), QStringLiteral("Edit game name"));
+        const QList<QByteArray> lines = ReadFile(log).split('\n');
+        QCOMPARE(lines.size(), 3);
+        const QJsonObject message = QJsonDocument::fromJson(lines[0]).object();
+        const QJsonObject input = QJsonDocument::fromJson(lines[1]).object();
+        QCOMPARE(QStringList({message[u"kind"].toString(), message[u"text"].toString(), message[u"title"].toString()}),
+            QStringList({u"message"_s, u"Remove \"Chess\"?\nReally?"_s, u"Brimvault"_s}));
+        QTEST(QString(message[u"icon"].toString() + u' ' + message[u"buttons"].toString()), "logged");
+        QCOMPARE(QStringList({input[u"kind"].toString(), input[u"text"].toString()}),
+            QStringList({u"input"_s, u"Edit game name"_s}));
     }
 
     void messageBox_data()
@@ -111,7 +78,6 @@ private Q_SLOTS:
         QTest::addColumn<int>("click"); // a QMessageBox::StandardButton, or 0 for Escape
         QTest::addColumn<int>("shownIcon");
         QTest::addColumn<PromptAnswer>("answer");
-
         QTest::newRow("critical, OK") << PromptIcon::Critical << PromptButtons::Ok << int(QMessageBox::Ok)
                                       << int(QMessageBox::Critical) << PromptAnswer::Ok;
         QTest::newRow("question, yes") << PromptIcon::Question << PromptButtons::YesNo << int(QMessageBox::Yes)
@@ -127,48 +93,39 @@ private Q_SLOTS:
         QTest::newRow("escape of three cancels")
             << PromptIcon::None << PromptButtons::YesNoCancel << 0 << int(QMessageBox::NoIcon) << PromptAnswer::Cancel;
     }
-
     void messageBox()
     {
         QFETCH(PromptIcon, icon);
         QFETCH(PromptButtons, buttons);
         QFETCH(int, click);
-        QFETCH(int, shownIcon);
-        QFETCH(PromptAnswer, answer);
-
         InstallWidgetPrompts();
         QStringList seen;
-        int seenIcon = -1;
         WhenModalShows([&](QWidget* widget) {
             auto* box = qobject_cast<QMessageBox*>(widget);
             QVERIFY(box);
-            seen << box->text() << box->windowTitle();
-            seenIcon = int(box->icon());
+            seen << box->text() << box->windowTitle() << QString::number(box->icon());
             if (click == 0)
                 QTest::keyClick(box, Qt::Key_Escape);
             else
                 box->button(QMessageBox::StandardButton(click))->click();
         });
-
-        QCOMPARE(ShowPrompt({QStringLiteral("Remove the game?"), QStringLiteral("Brimvault"), icon, buttons}), answer);
-        QCOMPARE(seen, (QStringList {QStringLiteral("Remove the game?"), QStringLiteral("Brimvault")}));
-        QCOMPARE(seenIcon, shownIcon);
+        QTEST(ShowPrompt({u"Remove the game?"_s, u"Brimvault"_s, icon, buttons}), "answer");
+        QFETCH(int, shownIcon);
+        QCOMPARE(seen, QStringList({u"Remove the game?"_s, u"Brimvault"_s, QString::number(shownIcon)}));
     }
 
     void inputBox_data()
     {
         QTest::addColumn<bool>("accept");
         QTest::addColumn<QString>("typed");
-        QTest::newRow("accepted with new text") << true << QStringLiteral("Solitaire");
+        QTest::newRow("accepted with new text") << true << u"Solitaire"_s;
         QTest::newRow("accepted empty") << true << QString();
-        QTest::newRow("cancelled") << false << QStringLiteral("ignored");
+        QTest::newRow("cancelled") << false << u"ignored"_s;
     }
-
     void inputBox()
     {
         QFETCH(bool, accept);
         QFETCH(QString, typed);
-
         InstallWidgetPrompts();
         QString seenDefault;
         WhenModalShows([&](QWidget* widget) {
@@ -178,10 +135,8 @@ private Q_SLOTS:
             dialog->setTextValue(typed);
             accept ? dialog->accept() : dialog->reject();
         });
-
-        const std::optional<QString> result
-            = AskInput({QStringLiteral("New name:"), QStringLiteral("Rename"), QStringLiteral("Old name")});
-        QCOMPARE(seenDefault, QStringLiteral("Old name"));
+        const std::optional<QString> result = AskInput({u"New name:"_s, u"Rename"_s, u"Old name"_s});
+        QCOMPARE(seenDefault, u"Old name"_s);
         QCOMPARE(result, accept ? std::optional<QString>(typed) : std::nullopt);
     }
 };
