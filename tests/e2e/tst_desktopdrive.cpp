@@ -63,30 +63,30 @@ public:
         environment.remove(u"WAYLAND_DISPLAY"_s);
         return environment.value(u"DISPLAY"_s).size() > 1;
     }
-    QString run(const QString& program, const QStringList& arguments, bool* ok = nullptr) const
+    bool run(const QString& program, const QStringList& arguments, QString* output = nullptr) const
     {
         QProcess process;
         process.setProcessEnvironment(environment);
         process.start(program, arguments);
         const bool ended = process.waitForFinished(20000);
-        if (ok)
-            *ok = ended && process.exitStatus() == QProcess::NormalExit && process.exitCode() == 0;
-        return QString::fromUtf8(process.readAllStandardOutput()).trimmed();
+        if (output)
+            *output = QString::fromUtf8(process.readAllStandardOutput()).trimmed();
+        return ended && process.exitStatus() == QProcess::NormalExit && process.exitCode() == 0;
     }
-    bool xdotool(const QStringList& arguments) const
+    bool xdotool(const QStringList& arguments) const { return run(u"xdotool"_s, arguments); }
+    QString ask(const QStringList& arguments) const
     {
-        bool ok = false;
-        run(u"xdotool"_s, arguments, &ok);
-        return ok;
+        QString output;
+        run(u"xdotool"_s, arguments, &output);
+        return output;
     }
     // Visible windows whose name matches; without a pattern every one, unnamed pop-up menus included.
     QList<qulonglong> windows(const QString& pattern = {}) const
     {
         QList<qulonglong> found;
         const QString search = pattern.isEmpty() ? u"--class"_s : u"--name"_s;
-        for (const QString& line :
-            run(u"xdotool"_s, {u"search"_s, u"--onlyvisible"_s, search, pattern.isEmpty() ? u".*"_s : pattern})
-                .split(u'\n', Qt::SkipEmptyParts))
+        for (const QString& line : ask({u"search"_s, u"--onlyvisible"_s, search, pattern.isEmpty() ? u".*"_s : pattern})
+                                       .split(u'\n', Qt::SkipEmptyParts))
             found << line.toULongLong();
         return found;
     }
@@ -109,18 +109,17 @@ public:
     // A window takes the keyboard a moment after it shows.
     bool waitForFocus(qulonglong window, int timeoutMs = TimeoutMs) const
     {
-        return QTest::qWaitFor(
-            [&] { return run(u"xdotool"_s, {u"getwindowfocus"_s}).toULongLong() == window; }, timeoutMs);
+        return QTest::qWaitFor([&] { return ask({u"getwindowfocus"_s}).toULongLong() == window; }, timeoutMs);
     }
     qint64 windowProcess(qulonglong window) const
     {
-        return run(u"xdotool"_s, {u"getwindowpid"_s, QString::number(window)}).toLongLong();
+        return ask({u"getwindowpid"_s, QString::number(window)}).toLongLong();
     }
     QRect geometry(qulonglong window) const
     {
         static const QRegularExpression value(u"^(\\w+)=(\\d+)$"_s, QRegularExpression::MultilineOption);
         QHash<QString, int> values;
-        const QString shell = run(u"xdotool"_s, {u"getwindowgeometry"_s, u"--shell"_s, QString::number(window)});
+        const QString shell = ask({u"getwindowgeometry"_s, u"--shell"_s, QString::number(window)});
         for (const QRegularExpressionMatch& match : value.globalMatch(shell))
             values.insert(match.captured(1), match.captured(2).toInt());
         return {values[u"X"_s], values[u"Y"_s], values[u"WIDTH"_s], values[u"HEIGHT"_s]};
@@ -143,16 +142,12 @@ public:
     bool type(const QString& text) const { return xdotool({u"type"_s, u"--delay"_s, u"60"_s, text}); }
     bool close(qulonglong window) const
     {
-        bool ok = false;
-        run(QStringLiteral(BRIMVAULT_DESKTOP_HELPER), {u"close"_s, QString::number(window)}, &ok);
-        return ok;
+        return run(QStringLiteral(BRIMVAULT_DESKTOP_HELPER), {u"close"_s, QString::number(window)});
     }
     QImage screenshot(const QString& png) const
     {
         QDir().mkpath(QFileInfo(png).absolutePath());
-        bool ok = false;
-        run(QStringLiteral(BRIMVAULT_DESKTOP_HELPER), {u"grab"_s, png}, &ok);
-        return ok ? QImage(png) : QImage();
+        return run(QStringLiteral(BRIMVAULT_DESKTOP_HELPER), {u"grab"_s, png}) ? QImage(png) : QImage();
     }
 
     QProcessEnvironment environment = QProcessEnvironment::systemEnvironment();
@@ -172,7 +167,6 @@ class TestDesktopDrive : public QObject {
     QProcess m_dragSource;
     qulonglong m_mainWindow = 0;
     QRect m_mainGeometry;
-    int m_shots = 0;
     QStringList m_installed;
     QString m_addedByHand;
     QString m_flashMovie;
@@ -182,12 +176,6 @@ class TestDesktopDrive : public QObject {
     QPoint listOrigin() const { return m_mainGeometry.topLeft() + ListInWindow; }
     QPoint iconCentre(int index) const { return listOrigin() + FirstIconCentre + QPoint(index * CellWidth, 0); }
 
-    // Every step leaves its picture: <build>/screenshots/e2e/NN-step.png.
-    void keepScreenshot(const QString& step)
-    {
-        m_desktop->screenshot(
-            QStringLiteral(BRIMVAULT_SCREENSHOT_DIR "/%1-%2.png").arg(++m_shots, 2, 10, QLatin1Char('0')).arg(step));
-    }
     QImage screen() const { return m_desktop->screenshot(m_env->path(u"poll.png"_s)); }
     bool screenShows(const QPoint& at, const QColor& wanted) const
     {
@@ -227,14 +215,10 @@ class TestDesktopDrive : public QObject {
     // The list's paths as the program's own discovery builds it, to find where each game is shown.
     QStringList discovered() const
     {
-        QProcess lister;
-        QProcessEnvironment headless = m_desktop->environment;
-        headless.insert(u"QT_QPA_PLATFORM"_s, u"offscreen"_s);
-        lister.setProcessEnvironment(headless);
-        lister.start(ProgramPath(), {u"--list"_s, u"--json"_s});
-        lister.waitForFinished(TimeoutMs);
+        QString json;
+        m_desktop->run(ProgramPath(), {u"--list"_s, u"--json"_s}, &json);
         QStringList paths;
-        for (const QJsonValue& entry : QJsonDocument::fromJson(lister.readAllStandardOutput()).array())
+        for (const QJsonValue& entry : QJsonDocument::fromJson(json.toUtf8()).array())
             paths << QDir::cleanPath(entry[u"path"_s].toString());
         return paths;
     }
@@ -277,7 +261,6 @@ class TestDesktopDrive : public QObject {
             if (m_desktop->waitForFocus(m_mainWindow, 15000) && waitForPopup(before, 15000)
                 && QTest::qWaitFor([&] { return itemLooksSelected(index); }, 3000))
                 return m_desktop->keys(QStringList(item, u"Down"_s) << u"Return"_s);
-            keepScreenshot(u"item-menu-retry"_s);
             m_desktop->keys({u"Escape"_s});
         }
         return false;
@@ -351,8 +334,6 @@ private Q_SLOTS:
         REQUIRE_TOOL("Xvfb", "xvfb");
         REQUIRE_TOOL("xdotool", "xdotool");
         REQUIRE_RUFFLE();
-        // Pictures of an earlier run would mix with this one's.
-        QDir(QStringLiteral(BRIMVAULT_SCREENSHOT_DIR)).removeRecursively();
         m_env = std::make_unique<TestEnvironment>();
         prepareLibrary();
         if (QTest::currentTestFailed())
@@ -373,7 +354,9 @@ private Q_SLOTS:
     {
         if (!QTest::currentTestFailed() || !m_desktop)
             return;
-        keepScreenshot(u"failed-"_s + QString::fromLatin1(QTest::currentTestFunction()));
+        // The screen of a failed step: <build>/screenshots/e2e/<step>.png.
+        m_desktop->screenshot(QStringLiteral(BRIMVAULT_SCREENSHOT_DIR "/")
+            + QString::fromLatin1(QTest::currentTestFunction()) + u".png"_s);
         qWarning("program's error output:\n%s", qPrintable(programErrors()));
     }
 
@@ -396,7 +379,6 @@ private Q_SLOTS:
         for (const QString& game : m_installed + QStringList {m_addedByHand})
             QTRY_VERIFY_WITH_TIMEOUT(QFile::exists(IconCacheFile(DataFolders::IconsFolder(), game)), TimeoutMs);
         QTRY_COMPARE_WITH_TIMEOUT(itemsShown(), int(games.size()), TimeoutMs);
-        keepScreenshot(u"list-filled"_s);
     }
 
     void arrowKeysAndEnterStartAGame()
@@ -413,7 +395,6 @@ private Q_SLOTS:
         QTRY_COMPARE_WITH_TIMEOUT(launches().size(), 1, TimeoutMs);
         QCOMPARE(launches().constFirst().arguments, QStringList {game});
         QCOMPARE(QDir(launches().constFirst().workingFolder).canonicalPath(), QFileInfo(game).canonicalPath());
-        keepScreenshot(u"game-started"_s);
         QTest::qWait(500);
         QCOMPARE(launches().size(), 1);
     }
@@ -433,7 +414,6 @@ private Q_SLOTS:
         const qulonglong host = m_desktop->waitForWindow(u"^Bubble Pop$"_s);
         QVERIFY2(host != 0, qPrintable(programErrors()));
         QTRY_VERIFY_WITH_TIMEOUT(screenShows(m_desktop->geometry(host).center(), FlashMovieColour), TimeoutMs);
-        keepScreenshot(u"flash-movie"_s);
         // A movie is no process of its own: the runner saw nothing new.
         QCOMPARE(launches().size(), 2);
         QVERIFY(m_desktop->close(host) && m_desktop->waitForGone(host));
@@ -460,7 +440,6 @@ private Q_SLOTS:
         QVERIFY(m_dragSource.waitForFinished(10000));
         QCOMPARE(CatalogueStore::AddedGames().size(), 2);
         QTRY_COMPARE_WITH_TIMEOUT(itemsShown(), shownBefore + 1, TimeoutMs);
-        keepScreenshot(u"dropped"_s);
     }
 
     void packageInstallsThroughTheService()
@@ -470,7 +449,6 @@ private Q_SLOTS:
         QVERIFY(!QFile::exists(installedGame));
         QVERIFY(chooseFromActionsMenu(3));
         QVERIFY2(waitForDialog(u"^Install game$"_s) != 0, qPrintable(programErrors()));
-        keepScreenshot(u"install-dialog"_s);
         // The file name field has the focus: a typed full path and Return choose the package.
         QVERIFY(m_desktop->type(QDir::toNativeSeparators(m_package)) && m_desktop->keys({u"Return"_s}));
         QTRY_VERIFY_WITH_TIMEOUT(QFile::exists(installedGame), TimeoutMs);
@@ -482,7 +460,6 @@ private Q_SLOTS:
             GetSetting(AppTitle(), u"Commands"_s, u"NewGameInstalled"_s, u"0"_s), u"0"_s, TimeoutMs);
         QTRY_COMPARE_WITH_TIMEOUT(itemsShown(), shownBefore + 1, TimeoutMs);
         QVERIFY(indexOf(installedGame) > 0);
-        keepScreenshot(u"installed"_s);
     }
 
     void gameIsRemoved()
@@ -499,14 +476,12 @@ private Q_SLOTS:
         QCOMPARE(itemsShown(), shownBefore);
 
         QVERIFY(chooseFromItemMenu(index, 3) && waitForDialog() != 0);
-        keepScreenshot(u"remove-question"_s);
         QVERIFY(m_desktop->keys({u"Return"_s}));
         QTRY_VERIFY_WITH_TIMEOUT(!QFileInfo::exists(QFileInfo(removed).absolutePath()), TimeoutMs);
         QTRY_COMPARE_WITH_TIMEOUT(itemsShown(), shownBefore - 1, TimeoutMs);
         QCOMPARE(discovered().size(), listed - 1);
         QVERIFY(QFile::exists(m_installed.at(0)) && QFile::exists(m_installed.at(2)));
         QCOMPARE(CatalogueStore::AddedGames().size(), 2);
-        keepScreenshot(u"removed"_s);
     }
 
     void closingShowsTheDueAdvertisement()
@@ -517,7 +492,6 @@ private Q_SLOTS:
         QVERIFY2(advert != 0, qPrintable(programErrors()));
         // The advertisement's own picture fills the window: its colour is at the centre.
         QTRY_VERIFY_WITH_TIMEOUT(screenShows(m_desktop->geometry(advert).center(), AdvertisementColour), TimeoutMs);
-        keepScreenshot(u"advertisement"_s);
         QCOMPARE(m_program.state(), QProcess::Running);
         QVERIFY(m_desktop->close(advert));
         QTRY_COMPARE_WITH_TIMEOUT(m_program.state(), QProcess::NotRunning, TimeoutMs);
