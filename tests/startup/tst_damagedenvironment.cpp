@@ -68,9 +68,7 @@ class TestDamagedEnvironment : public QObject {
         if (how == u"empty")
             return WriteFile(path, {});
         if (how == u"text")
-            return WriteFile(path,
-                "\x7f"
-                "ELF but nothing more\n");
+            return WriteFile(path, "\177ELF but nothing more\n");
         if (how == u"garbage")
             return WriteFile(path, "MZ" + garbage(8192));
         if (how == u"folder")
