@@ -1,8 +1,7 @@
-// The real program on a real X display, worked only with the pointer and the keyboard as a person works it:
+// The real program on its own X display, worked only with the pointer and the keyboard as a person works it:
 // the list fills, a game starts from the keyboard and from the item menu, a Flash movie plays, a file is
 // dropped, a package is installed through the service, a game is removed, and closing shows the advertisement.
 #include "AdvertisingFiles.h"
-#include "DesktopDriver.h"
 #include "LaunchRecords.h"
 #include "MainWindowFixture.h"
 #include "MovieFiles.h"
@@ -19,35 +18,24 @@
 
 #include <QJsonArray>
 #include <QJsonDocument>
-#include <QJsonObject>
+#include <QProcess>
+#include <QRegularExpression>
 #include <QTest>
 
 using namespace Brimvault;
+using namespace Qt::StringLiterals;
 
 namespace {
 
-constexpr int ScreenWidth = 1280;
-constexpr int ScreenHeight = 1024;
+constexpr int TimeoutMs = 60000;
 // The list's designed place in the window at 96 dots per inch (200 and 1260 twips), and its cells.
 constexpr QPoint ListInWindow(13, 84);
-constexpr int CellsPerRow = 9;
 constexpr int CellWidth = 80;
-constexpr int CellHeight = 76;
 constexpr QPoint FirstIconCentre(39, 30);
 // Below the first row the list shows its bare background.
 constexpr QPoint BackgroundSample(8, 200);
-// The Actions caption keeps this margin to the window's right edge in every language.
-constexpr int ActionsFromRight = 32;
-constexpr int ActionsY = 38;
 constexpr QColor FlashMovieColour(40, 160, 60);
 constexpr QColor AdvertisementColour(250, 200, 40);
-constexpr int TimeoutMs = 60000;
-// A menu click that shows nothing within this long is taken as lost and tried again.
-constexpr int MenuTimeoutMs = 15000;
-// Items of the Actions menu and of the item menu, counted in key presses from the top.
-constexpr int InstallItem = 3;
-constexpr int OpenOfflineItem = 1;
-constexpr int RemoveItem = 3;
 
 bool near(QRgb a, QRgb b, int tolerance)
 {
@@ -55,34 +43,118 @@ bool near(QRgb a, QRgb b, int tolerance)
         && qAbs(qBlue(a) - qBlue(b)) <= tolerance;
 }
 
-QPoint iconCentre(const QPoint& listOrigin, int index)
-{
-    return listOrigin + FirstIconCentre + QPoint(index * CellWidth, 0);
-}
-
-// Items fill the grid's cells left to right: the first row tells how many are shown.
-int itemsInFirstRow(const QImage& screen, const QPoint& listOrigin)
-{
-    const QRgb background = screen.pixel(listOrigin + BackgroundSample);
-    int items = 0;
-    for (; items < CellsPerRow; ++items) {
-        const QRect cell = QRect(listOrigin.x() + items * CellWidth + 2, listOrigin.y() + 4, CellWidth - 4, CellHeight)
-                               .intersected(screen.rect());
-        int different = 0;
-        for (int y = cell.top(); y <= cell.bottom(); ++y) {
-            for (int x = cell.left(); x <= cell.right(); ++x)
-                different += near(screen.pixel(x, y), background, 40) ? 0 : 1;
-        }
-        if (different < 15)
-            break;
+// A private X display worked through xdotool, and the desktop helper for screenshots, drags and closing.
+class Desktop {
+public:
+    ~Desktop()
+    {
+        m_xvfb.kill();
+        m_xvfb.waitForFinished(5000);
     }
-    return items;
-}
+    // Xvfb picks a free display number and writes it once it accepts clients.
+    bool start()
+    {
+        m_xvfb.start(u"Xvfb"_s,
+            {u"-displayfd"_s, u"1"_s, u"-screen"_s, u"0"_s, u"1280x1024x24"_s, u"-nolisten"_s, u"tcp"_s,
+                u"-noreset"_s});
+        (void)QTest::qWaitFor([&] { return m_xvfb.waitForReadyRead(100) && m_xvfb.canReadLine(); }, 30000);
+        environment.insert(u"DISPLAY"_s, u':' + QString::fromLatin1(m_xvfb.readLine().trimmed()));
+        environment.insert(u"QT_QPA_PLATFORM"_s, u"xcb"_s);
+        environment.remove(u"WAYLAND_DISPLAY"_s);
+        return environment.value(u"DISPLAY"_s).size() > 1;
+    }
+    bool run(const QString& program, const QStringList& arguments, QString* output = nullptr) const
+    {
+        QProcess process;
+        process.setProcessEnvironment(environment);
+        process.start(program, arguments);
+        const bool ended = process.waitForFinished(20000);
+        if (output)
+            *output = QString::fromUtf8(process.readAllStandardOutput()).trimmed();
+        return ended && process.exitStatus() == QProcess::NormalExit && process.exitCode() == 0;
+    }
+    bool xdotool(const QStringList& arguments) const { return run(u"xdotool"_s, arguments); }
+    QString ask(const QStringList& arguments) const
+    {
+        QString output;
+        run(u"xdotool"_s, arguments, &output);
+        return output;
+    }
+    // Visible windows whose name matches; without a pattern every one, unnamed pop-up menus included.
+    QList<qulonglong> windows(const QString& pattern = {}) const
+    {
+        QList<qulonglong> found;
+        const QString search = pattern.isEmpty() ? u"--class"_s : u"--name"_s;
+        for (const QString& line : ask({u"search"_s, u"--onlyvisible"_s, search, pattern.isEmpty() ? u".*"_s : pattern})
+                                       .split(u'\n', Qt::SkipEmptyParts))
+            found << line.toULongLong();
+        return found;
+    }
+    qulonglong waitForWindow(const QString& pattern, const QList<qulonglong>& except = {}) const
+    {
+        qulonglong found = 0;
+        const auto shown = [&] {
+            for (qulonglong window : windows(pattern)) {
+                if (!except.contains(window) && !geometry(window).isEmpty())
+                    return found = window;
+            }
+            return found = 0;
+        };
+        return QTest::qWaitFor(shown, TimeoutMs) ? found : 0;
+    }
+    bool waitForGone(qulonglong window) const
+    {
+        return QTest::qWaitFor([&] { return !windows().contains(window); }, TimeoutMs);
+    }
+    // A window takes the keyboard a moment after it shows.
+    bool waitForFocus(qulonglong window, int timeoutMs = TimeoutMs) const
+    {
+        return QTest::qWaitFor([&] { return ask({u"getwindowfocus"_s}).toULongLong() == window; }, timeoutMs);
+    }
+    qint64 windowProcess(qulonglong window) const
+    {
+        return ask({u"getwindowpid"_s, QString::number(window)}).toLongLong();
+    }
+    QRect geometry(qulonglong window) const
+    {
+        static const QRegularExpression value(u"^(\\w+)=(\\d+)$"_s, QRegularExpression::MultilineOption);
+        QHash<QString, int> values;
+        const QString shell = ask({u"getwindowgeometry"_s, u"--shell"_s, QString::number(window)});
+        for (const QRegularExpressionMatch& match : value.globalMatch(shell))
+            values.insert(match.captured(1), match.captured(2).toInt());
+        return {values[u"X"_s], values[u"Y"_s], values[u"WIDTH"_s], values[u"HEIGHT"_s]};
+    }
+    // The pointer's arrival is an event of its own; the next press must not overtake it.
+    bool moveTo(const QPoint& at) const
+    {
+        const bool moved = xdotool({u"mousemove"_s, QString::number(at.x()), QString::number(at.y())});
+        QTest::qWait(100);
+        return moved;
+    }
+    // xdotool waits between events so that every one is handled in turn.
+    bool click(const QPoint& at, int button = 1, int times = 1) const
+    {
+        return moveTo(at)
+            && xdotool(
+                {u"click"_s, u"--repeat"_s, QString::number(times), u"--delay"_s, u"60"_s, QString::number(button)});
+    }
+    bool keys(const QStringList& names) const { return xdotool(QStringList {u"key"_s, u"--delay"_s, u"60"_s} + names); }
+    bool type(const QString& text) const { return xdotool({u"type"_s, u"--delay"_s, u"60"_s, text}); }
+    bool close(qulonglong window) const
+    {
+        return run(QStringLiteral(BRIMVAULT_DESKTOP_HELPER), {u"close"_s, QString::number(window)});
+    }
+    QImage screenshot(const QString& png) const
+    {
+        QDir().mkpath(QFileInfo(png).absolutePath());
+        return run(QStringLiteral(BRIMVAULT_DESKTOP_HELPER), {u"grab"_s, png}) ? QImage(png) : QImage();
+    }
 
-QStringList downKeys(int count)
-{
-    return QStringList(count, QStringLiteral("Down")) << QStringLiteral("Return");
-}
+    QProcessEnvironment environment = QProcessEnvironment::systemEnvironment();
+
+private:
+    QProcess m_xvfb;
+};
 
 } // namespace
 
@@ -90,13 +162,11 @@ class TestDesktopDrive : public QObject {
     Q_OBJECT
 
     std::unique_ptr<TestEnvironment> m_env;
-    std::unique_ptr<DesktopDriver> m_desktop;
+    std::unique_ptr<Desktop> m_desktop;
     QProcess m_program;
     QProcess m_dragSource;
-    QProcessEnvironment m_programEnvironment;
     qulonglong m_mainWindow = 0;
     QRect m_mainGeometry;
-    int m_shots = 0;
     QStringList m_installed;
     QString m_addedByHand;
     QString m_flashMovie;
@@ -104,60 +174,57 @@ class TestDesktopDrive : public QObject {
     QString m_package;
 
     QPoint listOrigin() const { return m_mainGeometry.topLeft() + ListInWindow; }
+    QPoint iconCentre(int index) const { return listOrigin() + FirstIconCentre + QPoint(index * CellWidth, 0); }
 
-    // Every step leaves its picture: <build>/screenshots/e2e/NN-step.png.
-    void keepScreenshot(const QString& step)
-    {
-        m_desktop->screenshot(
-            QStringLiteral(BRIMVAULT_SCREENSHOT_DIR "/%1-%2.png").arg(++m_shots, 2, 10, QLatin1Char('0')).arg(step));
-    }
-
-    QImage screen() const { return m_desktop->screenshot(m_env->path(QStringLiteral("poll.png"))); }
-
-    int itemsShown() const
-    {
-        const QImage shot = screen();
-        return shot.isNull() ? -1 : itemsInFirstRow(shot, listOrigin());
-    }
-
+    QImage screen() const { return m_desktop->screenshot(m_env->path(u"poll.png"_s)); }
     bool screenShows(const QPoint& at, const QColor& wanted) const
     {
         const QImage shot = screen();
         return !shot.isNull() && near(shot.pixel(at), wanted.rgb(), 30);
     }
 
+    // Items fill the first row's cells left to right: the painted cells tell how many are shown.
+    int itemsShown() const
+    {
+        const QImage shot = screen();
+        if (shot.isNull())
+            return -1;
+        const QRgb background = shot.pixel(listOrigin() + BackgroundSample);
+        int items = 0;
+        for (bool painted = true; painted && items < 9; items += painted) {
+            int different = 0;
+            for (int y = 4; y < 80; ++y) {
+                for (int x = 2; x < CellWidth - 2; ++x)
+                    different += !near(shot.pixel(listOrigin() + QPoint(items * CellWidth + x, y)), background, 40);
+            }
+            painted = different >= 15;
+        }
+        return items;
+    }
+
     // The selection frame shows beside the icon, where nothing else paints.
     bool itemLooksSelected(int index) const
     {
         const QImage shot = screen();
-        const QPoint besideIcon = iconCentre(listOrigin(), index) - QPoint(28, 0);
-        return !shot.isNull() && !near(shot.pixel(besideIcon), shot.pixel(listOrigin() + BackgroundSample), 40);
+        return !shot.isNull()
+            && !near(shot.pixel(iconCentre(index) - QPoint(28, 0)), shot.pixel(listOrigin() + BackgroundSample), 40);
     }
 
     QString programErrors() { return QString::fromLocal8Bit(m_program.readAllStandardError()); }
 
-    // The paths in the list as the program's own discovery builds it, to find where each game is shown.
+    // The list's paths as the program's own discovery builds it, to find where each game is shown.
     QStringList discovered() const
     {
-        QProcess lister;
-        QProcessEnvironment headless = m_programEnvironment;
-        headless.insert(QStringLiteral("QT_QPA_PLATFORM"), QStringLiteral("offscreen"));
-        lister.setProcessEnvironment(headless);
-        lister.start(ProgramPath(), {QStringLiteral("--list"), QStringLiteral("--json")});
-        if (!lister.waitForFinished(TimeoutMs) || lister.exitCode() != 0)
-            qWarning("--list --json failed: %s", lister.readAllStandardError().constData());
+        QString json;
+        m_desktop->run(ProgramPath(), {u"--list"_s, u"--json"_s}, &json);
         QStringList paths;
-        for (const QJsonValue& entry : QJsonDocument::fromJson(lister.readAllStandardOutput()).array())
-            paths << QDir::cleanPath(entry[QStringLiteral("path")].toString());
+        for (const QJsonValue& entry : QJsonDocument::fromJson(json.toUtf8()).array())
+            paths << QDir::cleanPath(entry[u"path"_s].toString());
         return paths;
     }
-
     int indexOf(const QString& path) const { return int(discovered().indexOf(QDir::cleanPath(path))); }
 
-    QList<LaunchRecord> launches() const
-    {
-        return ReadLaunchRecords(m_env->path(QStringLiteral("launches")), QStringLiteral("runner"));
-    }
+    QList<LaunchRecord> launches() const { return ReadLaunchRecords(m_env->path(u"launches"_s), u"runner"_s); }
 
     // A pop-up menu has no name of its own: it is the program's one new visible window.
     bool waitForPopup(const QList<qulonglong>& before, int timeoutMs)
@@ -173,12 +240,14 @@ class TestDesktopDrive : public QObject {
             timeoutMs);
     }
 
+    // Items of a menu are counted in key presses from its top.
     bool chooseFromActionsMenu(int item)
     {
         const QList<qulonglong> before = m_desktop->windows();
-        const QPoint actions = m_mainGeometry.topLeft() + QPoint(m_mainGeometry.width() - ActionsFromRight, ActionsY);
-        return m_desktop->click(actions) && m_desktop->waitForFocus(m_mainWindow, TimeoutMs)
-            && waitForPopup(before, TimeoutMs) && m_desktop->keys(downKeys(item));
+        // The Actions caption keeps 32 pixels to the window's right edge in every language.
+        const QPoint actions = m_mainGeometry.topLeft() + QPoint(m_mainGeometry.width() - 32, 38);
+        return m_desktop->click(actions) && m_desktop->waitForFocus(m_mainWindow) && waitForPopup(before, TimeoutMs)
+            && m_desktop->keys(QStringList(item, u"Down"_s) << u"Return"_s);
     }
 
     // A right click selects the item and then opens its menu. A click that got lost on a busy machine (the
@@ -187,86 +256,76 @@ class TestDesktopDrive : public QObject {
     {
         for (int attempt = 0; attempt < 3; ++attempt) {
             const QList<qulonglong> before = m_desktop->windows();
-            if (!m_desktop->click(iconCentre(listOrigin(), index), 3))
+            if (!m_desktop->click(iconCentre(index), 3))
                 return false;
-            if (m_desktop->waitForFocus(m_mainWindow, MenuTimeoutMs) && waitForPopup(before, MenuTimeoutMs)
+            if (m_desktop->waitForFocus(m_mainWindow, 15000) && waitForPopup(before, 15000)
                 && QTest::qWaitFor([&] { return itemLooksSelected(index); }, 3000))
-                return m_desktop->keys(downKeys(item));
-            keepScreenshot(QStringLiteral("item-menu-retry"));
-            m_desktop->keys({QStringLiteral("Escape")});
+                return m_desktop->keys(QStringList(item, u"Down"_s) << u"Return"_s);
+            m_desktop->keys({u"Escape"_s});
         }
         return false;
     }
 
-    // A dialog counts as there once it shows and has the keyboard, so that no key goes to the window below.
-    // Message and input boxes carry the product name as their title, like the main window.
-    qulonglong waitForDialog(const QString& namePattern = QStringLiteral("^Brimvault$")) const
+    // A dialog counts as there once it has the keyboard, so that no key goes to the window below. Message and
+    // input boxes carry the product name as their title, like the main window.
+    qulonglong waitForDialog(const QString& pattern = u"^Brimvault$"_s) const
     {
-        const qulonglong dialog = m_desktop->waitForWindow(namePattern, TimeoutMs, {m_mainWindow});
-        return dialog != 0 && m_desktop->waitForFocus(dialog, TimeoutMs) ? dialog : 0;
+        const qulonglong dialog = m_desktop->waitForWindow(pattern, {m_mainWindow});
+        return dialog != 0 && m_desktop->waitForFocus(dialog) ? dialog : 0;
     }
 
     void prepareLibrary()
     {
-        // folder/file, fixture, name
-        const char* const installed[][3] = {{"Color Lines/lines.exe", "multi32.exe", "Color Lines"},
-            {"Harbor Chess/harborchess.exe", "twogroups32.exe", "Harbor Chess"},
-            {"Moon Sudoku/moonsudoku.exe", "multi64.exe", "Moon Sudoku"}};
-        for (const auto& game : installed) {
-            const QString path = DataFolders::GamesFolder() + QString::fromUtf8(game[0]);
-            const QString name = QString::fromUtf8(game[2]);
-            QVERIFY(WriteFile(path, ReadFile(PeFixture(QLatin1String(game[1])))) && WriteGameInfo(path, name, name));
+        for (const auto& [file, fixture] : {std::pair(u"Color Lines/lines.exe"_s, u"multi32.exe"_s),
+                 std::pair(u"Harbor Chess/harborchess.exe"_s, u"twogroups32.exe"_s),
+                 std::pair(u"Moon Sudoku/moonsudoku.exe"_s, u"multi64.exe"_s)}) {
+            const QString path = DataFolders::GamesFolder() + file;
+            const QString name = file.section(u'/', 0, 0);
+            QVERIFY(WriteFile(path, ReadFile(PeFixture(fixture))) && WriteGameInfo(path, name, name));
             m_installed << path;
         }
-        m_flashMovie = DataFolders::GamesFolder() + QStringLiteral("Bubble Pop/bubblepop.swf");
+        m_flashMovie = DataFolders::GamesFolder() + u"Bubble Pop/bubblepop.swf"_s;
         QVERIFY(WriteFlashMovie(m_flashMovie, FlashMovieColour)
-            && WriteGameInfo(m_flashMovie, QStringLiteral("Bubble Pop"), QStringLiteral("Bubble Pop")));
-        m_addedByHand = m_env->path(QStringLiteral("My Games/Pinewood/pinewood.exe"));
-        QVERIFY(WriteFile(m_addedByHand, ReadFile(PeFixture(QStringLiteral("multi32.exe")))));
-        QCOMPARE(CatalogueStore::AddGame(m_addedByHand), QStringLiteral("File1"));
-        m_dropped = m_env->path(QStringLiteral("Downloads/Rocket.exe"));
-        QVERIFY(WriteFile(m_dropped, ReadFile(PeFixture(QStringLiteral("twogroups64.exe")))));
+            && WriteGameInfo(m_flashMovie, u"Bubble Pop"_s, u"Bubble Pop"_s));
+        m_addedByHand = m_env->path(u"My Games/Pinewood/pinewood.exe"_s);
+        QVERIFY(WriteFile(m_addedByHand, ReadFile(PeFixture(u"multi32.exe"_s))));
+        QCOMPARE(CatalogueStore::AddGame(m_addedByHand), u"File1"_s);
+        m_dropped = m_env->path(u"Downloads/Rocket.exe"_s);
+        QVERIFY(WriteFile(m_dropped, ReadFile(PeFixture(u"twogroups64.exe"_s))));
 
-        const QString source = m_env->path(QStringLiteral("sources/Star Quest/StarQuest.exe"));
-        QVERIFY(WriteFile(source, ReadFile(PeFixture(QStringLiteral("multi64.exe"))))
-            && WriteGameInfo(source, QStringLiteral("Star Quest Deluxe"), QStringLiteral("Star Quest Deluxe")));
-        m_package = m_env->path(QStringLiteral("personal/StarQuest.bvxpak"));
-        QString output;
-        QVERIFY2(RunService({QStringLiteral("--pack"), QFileInfo(source).absolutePath(), m_package}, &output) == 0,
-            qPrintable(output));
+        const QString source = m_env->path(u"sources/Star Quest/StarQuest.exe"_s);
+        QVERIFY(WriteFile(source, ReadFile(PeFixture(u"multi64.exe"_s)))
+            && WriteGameInfo(source, u"Star Quest Deluxe"_s, u"Star Quest Deluxe"_s));
+        m_package = m_env->path(u"personal/StarQuest.bvxpak"_s);
+        QCOMPARE(RunService({u"--pack"_s, QFileInfo(source).absolutePath(), m_package}, nullptr), 0);
 
         // Games start through a runner that records how it was started.
-        const QString runner = m_env->path(QStringLiteral("runner"));
-        QVERIFY(InstallRecorder(QStringLiteral(LAUNCH_RECORDER), runner)
-            && QDir().mkpath(m_env->path(QStringLiteral("launches"))));
-        QVERIFY(SaveSetting(AppTitle(), QStringLiteral("Settings"), QStringLiteral("CompatibilityRunner"), runner));
-        QVERIFY(SaveSetting(AppTitle(), QStringLiteral("LocaleSettings"), QStringLiteral("LngFileName"),
-            QStringLiteral("English (Default)")));
-        QVERIFY(
-            SaveSetting(AppTitle(), QStringLiteral("LocaleSettings"), QStringLiteral("LngNik"), QStringLiteral("ENG")));
+        const QString runner = m_env->path(u"runner"_s);
+        QVERIFY(InstallRecorder(QStringLiteral(LAUNCH_RECORDER), runner) && QDir().mkpath(m_env->path(u"launches"_s)));
+        QVERIFY(SaveSetting(AppTitle(), u"Settings"_s, u"CompatibilityRunner"_s, runner)
+            && SaveSetting(AppTitle(), u"LocaleSettings"_s, u"LngFileName"_s, u"English (Default)"_s)
+            && SaveSetting(AppTitle(), u"LocaleSettings"_s, u"LngNik"_s, u"ENG"_s));
         QVERIFY(WriteDueAdvertisement(
-            DataFolders::ReclamaFolder(), QStringLiteral("http://127.0.0.1:9/summer-sale"), AdvertisementColour));
+            DataFolders::ReclamaFolder(), u"http://127.0.0.1:9/summer-sale"_s, AdvertisementColour));
     }
 
     // Settings and caches under the user's home belong to the temporary tree as well; every dialog is worked
     // by hand here.
     void setProgramEnvironment()
     {
-        const QString home = m_env->path(QStringLiteral("home"));
-        QVERIFY(QDir().mkpath(home + QStringLiteral("/runtime")));
-        QFile::setPermissions(home + QStringLiteral("/runtime"),
-            QFileDevice::ReadOwner | QFileDevice::WriteOwner | QFileDevice::ExeOwner);
-        m_programEnvironment = m_desktop->environment();
-        const QStringList variables {QStringLiteral("HOME"), home, QStringLiteral("XDG_CONFIG_HOME"),
-            home + QStringLiteral("/.config"), QStringLiteral("XDG_DATA_HOME"), home + QStringLiteral("/.local/share"),
-            QStringLiteral("XDG_CACHE_HOME"), home + QStringLiteral("/.cache"), QStringLiteral("XDG_RUNTIME_DIR"),
-            home + QStringLiteral("/runtime"), QStringLiteral("BV_LAUNCH_RECORD"),
-            m_env->path(QStringLiteral("launches")), QStringLiteral("QTWEBENGINE_DISABLE_SANDBOX"), QStringLiteral("1"),
-            QStringLiteral("QTWEBENGINE_CHROMIUM_FLAGS"), QStringLiteral("--disable-gpu")};
+        const QString home = m_env->path(u"home"_s);
+        QVERIFY(QDir().mkpath(home + u"/runtime"_s));
+        QFile::setPermissions(
+            home + u"/runtime"_s, QFileDevice::ReadOwner | QFileDevice::WriteOwner | QFileDevice::ExeOwner);
+        const QStringList variables {u"HOME"_s, home, u"XDG_CONFIG_HOME"_s, home + u"/.config"_s, u"XDG_DATA_HOME"_s,
+            home + u"/.local/share"_s, u"XDG_CACHE_HOME"_s, home + u"/.cache"_s, u"XDG_RUNTIME_DIR"_s,
+            home + u"/runtime"_s, u"BV_LAUNCH_RECORD"_s, m_env->path(u"launches"_s), u"QTWEBENGINE_DISABLE_SANDBOX"_s,
+            u"1"_s, u"QTWEBENGINE_CHROMIUM_FLAGS"_s, u"--disable-gpu"_s};
         for (qsizetype i = 0; i < variables.size(); i += 2)
-            m_programEnvironment.insert(variables.at(i), variables.at(i + 1));
-        for (const char* name : {"BRIMVAULT_DIALOG_ANSWER", "BRIMVAULT_PROMPT_LOG", "BRIMVAULT_WINDOW_REPORT"})
-            m_programEnvironment.remove(QString::fromLatin1(name));
+            m_desktop->environment.insert(variables.at(i), variables.at(i + 1));
+        for (const QString& name :
+            {u"BRIMVAULT_DIALOG_ANSWER"_s, u"BRIMVAULT_PROMPT_LOG"_s, u"BRIMVAULT_WINDOW_REPORT"_s})
+            m_desktop->environment.remove(name);
     }
 
 private Q_SLOTS:
@@ -275,33 +334,29 @@ private Q_SLOTS:
         REQUIRE_TOOL("Xvfb", "xvfb");
         REQUIRE_TOOL("xdotool", "xdotool");
         REQUIRE_RUFFLE();
-        // Pictures of an earlier run would mix with this one's.
-        QDir(QStringLiteral(BRIMVAULT_SCREENSHOT_DIR)).removeRecursively();
         m_env = std::make_unique<TestEnvironment>();
         prepareLibrary();
         if (QTest::currentTestFailed())
             return;
-        m_desktop = std::make_unique<DesktopDriver>(QStringLiteral(BRIMVAULT_DESKTOP_HELPER));
-        const QString failure = m_desktop->start(ScreenWidth, ScreenHeight);
-        QVERIFY2(failure.isEmpty(), qPrintable(failure));
+        m_desktop = std::make_unique<Desktop>();
+        QVERIFY2(m_desktop->start(), "Xvfb gave no display number");
         setProgramEnvironment();
-
-        m_program.setProcessEnvironment(m_programEnvironment);
+        m_program.setProcessEnvironment(m_desktop->environment);
         m_program.setWorkingDirectory(m_env->root());
         m_program.start(ProgramPath(), QStringList());
-        QVERIFY2(m_program.waitForStarted(30000), qPrintable(m_program.errorString()));
-        m_mainWindow = m_desktop->waitForWindow(QStringLiteral("^Brimvault$"), TimeoutMs);
+        m_mainWindow = m_desktop->waitForWindow(u"^Brimvault$"_s);
         QVERIFY2(m_mainWindow != 0, qPrintable(programErrors()));
-        m_mainGeometry = m_desktop->windowGeometry(m_mainWindow);
-        QVERIFY(m_mainGeometry.width() > 400 && m_mainGeometry.height() > 300);
-        QVERIFY(QRect(0, 0, ScreenWidth, ScreenHeight).contains(m_mainGeometry));
+        m_mainGeometry = m_desktop->geometry(m_mainWindow);
+        QVERIFY(m_mainGeometry.width() > 400 && QRect(0, 0, 1280, 1024).contains(m_mainGeometry));
     }
 
     void cleanup()
     {
         if (!QTest::currentTestFailed() || !m_desktop)
             return;
-        keepScreenshot(QStringLiteral("failed-") + QString::fromLatin1(QTest::currentTestFunction()));
+        // The screen of a failed step: <build>/screenshots/e2e/<step>.png.
+        m_desktop->screenshot(QStringLiteral(BRIMVAULT_SCREENSHOT_DIR "/")
+            + QString::fromLatin1(QTest::currentTestFunction()) + u".png"_s);
         qWarning("program's error output:\n%s", qPrintable(programErrors()));
     }
 
@@ -324,7 +379,6 @@ private Q_SLOTS:
         for (const QString& game : m_installed + QStringList {m_addedByHand})
             QTRY_VERIFY_WITH_TIMEOUT(QFile::exists(IconCacheFile(DataFolders::IconsFolder(), game)), TimeoutMs);
         QTRY_COMPARE_WITH_TIMEOUT(itemsShown(), int(games.size()), TimeoutMs);
-        keepScreenshot(QStringLiteral("list-filled"));
     }
 
     void arrowKeysAndEnterStartAGame()
@@ -335,16 +389,12 @@ private Q_SLOTS:
             target = qMax(target, indexOf(game));
         QVERIFY(target > 1);
         const QString game = discovered().at(target);
-
         // A click selects without starting; the arrows move on, Enter starts.
-        QVERIFY(m_desktop->click(iconCentre(listOrigin(), 0)));
-        QVERIFY(m_desktop->waitForFocus(m_mainWindow, TimeoutMs));
-        QVERIFY(m_desktop->keys(QStringList(target, QStringLiteral("Right")) << QStringLiteral("Return")));
+        QVERIFY(m_desktop->click(iconCentre(0)) && m_desktop->waitForFocus(m_mainWindow));
+        QVERIFY(m_desktop->keys(QStringList(target, u"Right"_s) << u"Return"_s));
         QTRY_COMPARE_WITH_TIMEOUT(launches().size(), 1, TimeoutMs);
         QCOMPARE(launches().constFirst().arguments, QStringList {game});
         QCOMPARE(QDir(launches().constFirst().workingFolder).canonicalPath(), QFileInfo(game).canonicalPath());
-        keepScreenshot(QStringLiteral("game-started"));
-        // Nothing else was started on the way.
         QTest::qWait(500);
         QCOMPARE(launches().size(), 1);
     }
@@ -352,46 +402,37 @@ private Q_SLOTS:
     void openGameOfflineStartsTheFileOnDisk()
     {
         // The command upper-cases the path; on a file system that minds case the file must still be found.
-        const int index = indexOf(m_installed.at(0));
-        QVERIFY(index > 0);
-        QVERIFY(chooseFromItemMenu(index, OpenOfflineItem));
+        QVERIFY(chooseFromItemMenu(indexOf(m_installed.at(0)), 1));
         QTRY_COMPARE_WITH_TIMEOUT(launches().size(), 2, TimeoutMs);
         QCOMPARE(launches().constLast().arguments, QStringList {m_installed.at(0)});
     }
 
     void flashMovieOpensInTheMediaHost()
     {
-        const int index = indexOf(m_flashMovie);
-        QVERIFY(index > 0);
-        QVERIFY(m_desktop->doubleClick(iconCentre(listOrigin(), index)));
+        QVERIFY(m_desktop->click(iconCentre(indexOf(m_flashMovie)), 1, 2));
         // The host window is captioned with the game's name and plays the movie.
-        const qulonglong host = m_desktop->waitForWindow(QStringLiteral("^Bubble Pop$"), TimeoutMs);
+        const qulonglong host = m_desktop->waitForWindow(u"^Bubble Pop$"_s);
         QVERIFY2(host != 0, qPrintable(programErrors()));
-        QTRY_VERIFY_WITH_TIMEOUT(screenShows(m_desktop->windowGeometry(host).center(), FlashMovieColour), TimeoutMs);
-        keepScreenshot(QStringLiteral("flash-movie"));
+        QTRY_VERIFY_WITH_TIMEOUT(screenShows(m_desktop->geometry(host).center(), FlashMovieColour), TimeoutMs);
         // A movie is no process of its own: the runner saw nothing new.
         QCOMPARE(launches().size(), 2);
-        QVERIFY(m_desktop->closeWindow(host) && m_desktop->waitForWindowGone(host, TimeoutMs));
+        QVERIFY(m_desktop->close(host) && m_desktop->waitForGone(host));
         QCOMPARE(m_program.state(), QProcess::Running);
     }
 
     void droppedExecutableIsAdded()
     {
         const int shownBefore = itemsShown();
-        QVERIFY(shownBefore > 0);
-        m_dragSource.setProcessEnvironment(m_programEnvironment);
-        m_dragSource.start(m_desktop->helperProgram(), {QStringLiteral("drag"), m_dropped});
-        const qulonglong source = m_desktop->waitForWindow(QStringLiteral("^Brimvault drag source$"), TimeoutMs);
-        QVERIFY(source != 0);
-        const QPoint from = m_desktop->windowGeometry(source).center();
-        QVERIFY(!m_mainGeometry.contains(from));
-
-        const QPoint target = listOrigin() + QPoint(400, 250);
-        QVERIFY(m_desktop->moveTo(from) && m_desktop->xdotool({QStringLiteral("mousedown"), QStringLiteral("1")}));
+        m_dragSource.setProcessEnvironment(m_desktop->environment);
+        m_dragSource.start(QStringLiteral(BRIMVAULT_DESKTOP_HELPER), {u"drag"_s, m_dropped});
+        const qulonglong source = m_desktop->waitForWindow(u"^Brimvault drag source$"_s);
+        const QPoint from = m_desktop->geometry(source).center();
+        QVERIFY(source != 0 && !m_mainGeometry.contains(from));
+        const QPoint to = listOrigin() + QPoint(400, 250);
+        QVERIFY(m_desktop->moveTo(from) && m_desktop->xdotool({u"mousedown"_s, u"1"_s}));
         for (int step = 1; step <= 5; ++step)
-            QVERIFY(m_desktop->moveTo(from + (target - from) * step / 5));
-        QVERIFY(m_desktop->moveTo(target + QPoint(4, 4)));
-        QVERIFY(m_desktop->xdotool({QStringLiteral("mouseup"), QStringLiteral("1")}));
+            QVERIFY(m_desktop->moveTo(from + (to - from) * step / 5));
+        QVERIFY(m_desktop->moveTo(to + QPoint(4, 4)) && m_desktop->xdotool({u"mouseup"_s, u"1"_s}));
 
         QTRY_VERIFY_WITH_TIMEOUT(CatalogueStore::FindAddedGame(m_dropped).has_value(), TimeoutMs);
         // The program has taken the dropped data: the drag source has done its part.
@@ -399,33 +440,26 @@ private Q_SLOTS:
         QVERIFY(m_dragSource.waitForFinished(10000));
         QCOMPARE(CatalogueStore::AddedGames().size(), 2);
         QTRY_COMPARE_WITH_TIMEOUT(itemsShown(), shownBefore + 1, TimeoutMs);
-        keepScreenshot(QStringLiteral("dropped"));
     }
 
     void packageInstallsThroughTheService()
     {
         const int shownBefore = itemsShown();
-        const QString installedGame = DataFolders::GamesFolder() + QStringLiteral("Star Quest/StarQuest.exe");
+        const QString installedGame = DataFolders::GamesFolder() + u"Star Quest/StarQuest.exe"_s;
         QVERIFY(!QFile::exists(installedGame));
-
-        QVERIFY(chooseFromActionsMenu(InstallItem));
-        QVERIFY2(waitForDialog(QStringLiteral("^Install game$")) != 0, qPrintable(programErrors()));
-        keepScreenshot(QStringLiteral("install-dialog"));
+        QVERIFY(chooseFromActionsMenu(3));
+        QVERIFY2(waitForDialog(u"^Install game$"_s) != 0, qPrintable(programErrors()));
         // The file name field has the focus: a typed full path and Return choose the package.
-        QVERIFY(
-            m_desktop->typeText(QDir::toNativeSeparators(m_package)) && m_desktop->keys({QStringLiteral("Return")}));
-
+        QVERIFY(m_desktop->type(QDir::toNativeSeparators(m_package)) && m_desktop->keys({u"Return"_s}));
         QTRY_VERIFY_WITH_TIMEOUT(QFile::exists(installedGame), TimeoutMs);
         QTRY_VERIFY_WITH_TIMEOUT(QFile::exists(IconCacheFile(DataFolders::IconsFolder(), installedGame)), TimeoutMs);
         QTRY_COMPARE_WITH_TIMEOUT(itemsShown(), shownBefore + 1, TimeoutMs);
         // The service also raised the new-game signal: the window takes it within a few seconds and fills its
         // list once more, dropping the selection and any open menu. Later steps start after that.
         QTRY_COMPARE_WITH_TIMEOUT(
-            GetSetting(AppTitle(), QStringLiteral("Commands"), QStringLiteral("NewGameInstalled"), QStringLiteral("0")),
-            QStringLiteral("0"), TimeoutMs);
+            GetSetting(AppTitle(), u"Commands"_s, u"NewGameInstalled"_s, u"0"_s), u"0"_s, TimeoutMs);
         QTRY_COMPARE_WITH_TIMEOUT(itemsShown(), shownBefore + 1, TimeoutMs);
         QVERIFY(indexOf(installedGame) > 0);
-        keepScreenshot(QStringLiteral("installed"));
     }
 
     void gameIsRemoved()
@@ -433,44 +467,33 @@ private Q_SLOTS:
         const QString removed = m_installed.at(1);
         const qsizetype listed = discovered().size();
         const int index = indexOf(removed);
-        QVERIFY(index > 0);
         const int shownBefore = itemsShown();
-
         // Escape answers No: the game stays.
-        QVERIFY(chooseFromItemMenu(index, RemoveItem));
+        QVERIFY(chooseFromItemMenu(index, 3));
         const qulonglong refused = waitForDialog();
-        QVERIFY(refused != 0);
-        QVERIFY(m_desktop->keys({QStringLiteral("Escape")}) && m_desktop->waitForWindowGone(refused, TimeoutMs));
+        QVERIFY(refused != 0 && m_desktop->keys({u"Escape"_s}) && m_desktop->waitForGone(refused));
         QVERIFY(QFile::exists(removed));
         QCOMPARE(itemsShown(), shownBefore);
 
-        QVERIFY(chooseFromItemMenu(index, RemoveItem));
-        QVERIFY(waitForDialog() != 0);
-        keepScreenshot(QStringLiteral("remove-question"));
-        QVERIFY(m_desktop->keys({QStringLiteral("Return")}));
-
+        QVERIFY(chooseFromItemMenu(index, 3) && waitForDialog() != 0);
+        QVERIFY(m_desktop->keys({u"Return"_s}));
         QTRY_VERIFY_WITH_TIMEOUT(!QFileInfo::exists(QFileInfo(removed).absolutePath()), TimeoutMs);
         QTRY_COMPARE_WITH_TIMEOUT(itemsShown(), shownBefore - 1, TimeoutMs);
         QCOMPARE(discovered().size(), listed - 1);
         QVERIFY(QFile::exists(m_installed.at(0)) && QFile::exists(m_installed.at(2)));
         QCOMPARE(CatalogueStore::AddedGames().size(), 2);
-        keepScreenshot(QStringLiteral("removed"));
     }
 
     void closingShowsTheDueAdvertisement()
     {
         const QList<qulonglong> before = m_desktop->windows();
-        QVERIFY(m_desktop->closeWindow(m_mainWindow) && m_desktop->waitForWindowGone(m_mainWindow, TimeoutMs));
-        const qulonglong advert = m_desktop->waitForWindow(QStringLiteral(".+"), TimeoutMs, before);
+        QVERIFY(m_desktop->close(m_mainWindow) && m_desktop->waitForGone(m_mainWindow));
+        const qulonglong advert = m_desktop->waitForWindow(u"^Advertising$"_s, before);
         QVERIFY2(advert != 0, qPrintable(programErrors()));
-        QCOMPARE(m_desktop->windowName(advert), QStringLiteral("Advertising"));
         // The advertisement's own picture fills the window: its colour is at the centre.
-        QTRY_VERIFY_WITH_TIMEOUT(
-            screenShows(m_desktop->windowGeometry(advert).center(), AdvertisementColour), TimeoutMs);
-        keepScreenshot(QStringLiteral("advertisement"));
+        QTRY_VERIFY_WITH_TIMEOUT(screenShows(m_desktop->geometry(advert).center(), AdvertisementColour), TimeoutMs);
         QCOMPARE(m_program.state(), QProcess::Running);
-
-        QVERIFY(m_desktop->closeWindow(advert));
+        QVERIFY(m_desktop->close(advert));
         QTRY_COMPARE_WITH_TIMEOUT(m_program.state(), QProcess::NotRunning, TimeoutMs);
         QCOMPARE(m_program.exitStatus(), QProcess::NormalExit);
         QVERIFY2(m_program.exitCode() == 0, qPrintable(programErrors()));

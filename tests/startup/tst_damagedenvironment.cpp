@@ -1,7 +1,7 @@
 // Start-up of the real program when something it reads is damaged: the settings, their folder, the data
 // folders, the icon cache, the chosen language file, the component libraries and their registry. Each case
-// runs the program as a child process in a temporary tree and checks how it ended, what it said and that the
-// user's files are as they were.
+// runs the program in a temporary tree and checks how it ended, what it said and that the user's files are
+// as they were.
 #include "PeFixtures.h"
 #include "ProgramRun.h"
 #include "TestEnvironment.h"
@@ -17,9 +17,8 @@
 #include <QJsonArray>
 #include <QtTest>
 
-#include <memory>
-
 using namespace Brimvault;
+using namespace Qt::StringLiterals;
 
 namespace {
 
@@ -29,41 +28,13 @@ QByteArray garbage(qsizetype size)
     return RandomBytes(size, 20261121) + '\n';
 }
 
-// Puts a damaged thing at path: "removed", "empty", "garbage", "text", "folder", "pipe", "truncated N" (the
-// first N percent of `real`), or "intact".
-bool damage(const QString& path, const QString& how, const QByteArray& real = {})
-{
-    if (how == QStringLiteral("intact"))
-        return true;
-    QFile::remove(path);
-    QDir(path).removeRecursively();
-    if (how == QStringLiteral("empty"))
-        return WriteFile(path, {});
-    if (how == QStringLiteral("garbage"))
-        return WriteFile(path, "MZ" + garbage(8192));
-    if (how == QStringLiteral("text"))
-        return WriteFile(path,
-            "\x7f"
-            "ELF but nothing more\n");
-    if (how == QStringLiteral("folder"))
-        return QDir().mkpath(path);
-    if (how == QStringLiteral("pipe"))
-        return MakeNamedPipe(path);
-    if (how.startsWith(QStringLiteral("truncated ")))
-        return WriteFile(path, real.left(real.size() * how.mid(10).toInt() / 100));
-    return how == QStringLiteral("removed");
-}
-
 // The entry at path and everything below it, as SnapshotTree shows them.
 QMap<QString, QByteArray> snapshotOf(const QString& path)
 {
     const QFileInfo info(path);
-    const QMap<QString, QByteArray> all = SnapshotTree(info.absolutePath());
-    QMap<QString, QByteArray> entry;
-    for (auto it = all.cbegin(); it != all.cend(); ++it) {
-        if (it.key() == info.fileName() || it.key().startsWith(info.fileName() + u'/'))
-            entry.insert(it.key(), it.value());
-    }
+    QMap<QString, QByteArray> entry = SnapshotTree(info.absolutePath());
+    entry.removeIf(
+        [&](auto it) { return it.key() != info.fileName() && !it.key().startsWith(info.fileName() + u'/'); });
     return entry;
 }
 
@@ -71,11 +42,6 @@ QMap<QString, QByteArray> snapshotOf(const QString& path)
 QByteArray addedGameSettings(const QString& gamePath)
 {
     return "[Files]\nCount=1\nFile1=" + gamePath.toUtf8() + '\n';
-}
-
-QString setting(const QString& section, const QString& key)
-{
-    return GetSetting(AppTitle(), section, key);
 }
 
 } // namespace
@@ -90,13 +56,37 @@ class TestDamagedEnvironment : public QObject {
 
     ProgramOutcome run(const ProgramRunOptions& options = {}) { return RunProgram(*m_env, m_program->path(), options); }
 
+    // Puts a damaged thing at path: "removed", "empty", "garbage", "text", "folder", "pipe", "link TARGET" (in
+    // the tree), "truncated N" (the first N percent of `real`), or "intact".
+    bool spoil(const QString& path, const QString& how, const QByteArray& real = {})
+    {
+        if (how == u"intact")
+            return true;
+        QFile::remove(path);
+        QDir(path).removeRecursively();
+        QDir().mkpath(QFileInfo(path).absolutePath());
+        if (how == u"empty")
+            return WriteFile(path, {});
+        if (how == u"text")
+            return WriteFile(path, "\177ELF but nothing more\n");
+        if (how == u"garbage")
+            return WriteFile(path, "MZ" + garbage(8192));
+        if (how == u"folder")
+            return QDir().mkpath(path);
+        if (how == u"pipe")
+            return MakeNamedPipe(path);
+        if (how.startsWith(u"link "))
+            return QFile::link(m_env->path(how.mid(5)), path);
+        if (how.startsWith(u"truncated "))
+            return WriteFile(path, real.left(real.size() * how.mid(10).toInt() / 100));
+        return how == u"removed";
+    }
+
     // A game executable of the user's, outside every folder the program scans.
     QString userGame()
     {
-        const QString path = m_env->path(QStringLiteral("personal/My Games/chess.exe"));
-        QDir().mkpath(QFileInfo(path).absolutePath());
-        QFile::copy(PeFixture(QStringLiteral("nores32.exe")), path);
-        return path;
+        const QString path = m_env->path(u"personal/My Games/chess.exe"_s);
+        return WriteFile(path, ReadFile(PeFixture(u"nores32.exe"_s))) ? path : QString();
     }
 
 private Q_SLOTS:
@@ -104,10 +94,8 @@ private Q_SLOTS:
     {
         m_env = std::make_unique<TestEnvironment>();
         m_program = std::make_unique<ProgramFolderCopy>();
-        QVERIFY(m_program->isValid());
-        QVERIFY(!PeFixture(QStringLiteral("multi32.exe")).isEmpty());
+        QVERIFY(m_program->isValid() && !PeFixture(u"multi32.exe"_s).isEmpty());
     }
-
     void cleanup()
     {
         m_program.reset();
@@ -118,79 +106,64 @@ private Q_SLOTS:
     // message. Readable but damaged settings: the damaged lines are kept as they are and the program runs.
     void damagedSettingsFile_data()
     {
+        QTest::addColumn<QString>("damaged"); // relative to the tree
         QTest::addColumn<QString>("damage");
         QTest::addColumn<QByteArray>("before"); // written before and after the intact settings
         QTest::addColumn<QByteArray>("after");
         QTest::addColumn<bool>("runs");
-
+        const QString file = u"settings/Brimvault.ini"_s;
+        const QString lock = u"settings/Brimvault.ini.lock"_s;
+        const QString intact = u"intact"_s;
         const QByteArray none;
-        QTest::newRow("folder in the file's place") << QStringLiteral("folder") << none << none << false;
-        QTest::newRow("named pipe in the file's place") << QStringLiteral("pipe") << none << none << false;
-        QTest::newRow("settings folder is a file") << QStringLiteral("folder is a file") << none << none << false;
-        QTest::newRow("folder in the lock file's place") << QStringLiteral("lock folder") << none << none << false;
-        QTest::newRow("named pipe in the lock file's place") << QStringLiteral("lock pipe") << none << none << true;
-        QTest::newRow("link to the user's own file") << QStringLiteral("link") << none << none << true;
-        QTest::newRow("binary garbage before the sections") << QString() << garbage(64 * 1024) << none << true;
+        QTest::newRow("folder in the file's place") << file << u"folder"_s << none << none << false;
+        QTest::newRow("named pipe in the file's place") << file << u"pipe"_s << none << none << false;
+        QTest::newRow("settings folder is a file") << u"settings"_s << u"text"_s << none << none << false;
+        QTest::newRow("folder in the lock file's place") << lock << u"folder"_s << none << none << false;
+        QTest::newRow("named pipe in the lock file's place") << lock << u"pipe"_s << none << none << true;
+        // Kept elsewhere by the user (a folder of dotfiles, say): written through, the link stays.
+        QTest::newRow("link to the user's own file")
+            << file << u"link personal/dotfiles/Brimvault.ini"_s << none << none << true;
+        QTest::newRow("binary garbage before the sections") << file << intact << garbage(64 * 1024) << none << true;
         QTest::newRow("NUL bytes inside a value")
-            << QString() << none << QByteArray("[Settings]\nQuilletVersion=1") + '\0' + ".0\n"
+            << file << intact << none << QByteArray("[Settings]\nQuilletVersion=1") + '\0' + ".0\n"
             << true;
-        QTest::newRow("10 MB line") << QString() << none << "; " + QByteArray(10 * 1024 * 1024, 'x') + '\n' << true;
-        QTest::newRow("invalid UTF-8") << QString() << QByteArray("[FilesNames]\nFileName1=\xff\xfe\xc3(\x80\n") << none
-                                       << true;
+        QTest::newRow("10 MB line") << file << intact << none << "; " + QByteArray(10 * 1024 * 1024, 'x') + '\n'
+                                    << true;
+        QTest::newRow("invalid UTF-8") << file << intact << QByteArray("[FilesNames]\nFileName1=\xff\xfe\xc3(\x80\n")
+                                       << none << true;
         QTest::newRow("cut off in the middle of a line")
-            << QString() << none << QByteArray("[LocaleSettings]\nLngFileN") << true;
+            << file << intact << none << QByteArray("[LocaleSettings]\nLngFileN") << true;
     }
-
     void damagedSettingsFile()
     {
+        QFETCH(QString, damaged);
         QFETCH(QString, damage);
         QFETCH(QByteArray, before);
         QFETCH(QByteArray, after);
         QFETCH(bool, runs);
-
         const QString game = userGame();
-        const QByteArray intact = addedGameSettings(game);
+        const QByteArray original = before + addedGameSettings(game) + after;
         const QString settings = m_env->settingsFile();
-        const QString folder = QFileInfo(settings).absolutePath();
-        QString damaged = settings; // the entry that must be as it was, or keep the user's bytes first
-        QByteArray original = before + intact + after;
-        if (damage == QStringLiteral("folder is a file")) {
-            QVERIFY(QDir(folder).removeRecursively() && WriteFile(folder, intact));
-            damaged = folder;
-        } else if (damage == QStringLiteral("lock folder")) {
-            damaged = settings + QStringLiteral(".lock");
-            QVERIFY(QDir().mkpath(damaged));
-        } else if (damage == QStringLiteral("link")) {
-            // Kept elsewhere by the user (a folder of dotfiles, say): written through, the link stays.
-            damaged = m_env->path(QStringLiteral("personal/dotfiles/Brimvault.ini"));
-            QVERIFY(WriteFile(damaged, original) && QFile::link(damaged, settings));
-        } else if (damage == QStringLiteral("folder")) {
-            QVERIFY(WriteFile(settings + QStringLiteral("/keep.txt"), intact));
-        } else if (damage == QStringLiteral("pipe")) {
-            QVERIFY(MakeNamedPipe(settings));
-        } else {
-            if (damage == QStringLiteral("lock pipe"))
-                QVERIFY(MakeNamedPipe(settings + QStringLiteral(".lock")));
-            QVERIFY(WriteFile(settings, original));
-        }
-        const QMap<QString, QByteArray> untouched = snapshotOf(damaged);
+        QVERIFY(WriteFile(settings, original) && WriteFile(m_env->path(u"personal/dotfiles/Brimvault.ini"_s), original)
+            && spoil(m_env->path(damaged), damage));
+        const QMap<QString, QByteArray> untouched = snapshotOf(m_env->path(damaged));
 
         const ProgramOutcome outcome = run();
 
         if (!runs) {
-            VERIFY_OUTCOME(outcome.stoppedWithAdminMessage(), outcome);
             // The message box cannot say more; standard error names the place that failed.
-            VERIFY_OUTCOME(outcome.standardError.contains(folder), outcome);
-            QCOMPARE(snapshotOf(damaged), untouched);
+            VERIFY_OUTCOME(
+                outcome.stoppedWithAdminMessage() && outcome.standardError.contains(m_env->path(u"settings"_s)),
+                outcome);
+            QCOMPARE(snapshotOf(m_env->path(damaged)), untouched);
             return;
         }
-        VERIFY_OUTCOME(outcome.showedWindow() && outcome.items(QStringLiteral("data")).contains(game), outcome);
+        VERIFY_OUTCOME(outcome.showedWindow() && outcome.items(u"data"_s).contains(game), outcome);
         // The program added its own values after the user's bytes and kept every one of them.
-        QCOMPARE(QFileInfo(settings).isSymLink(), damage == QStringLiteral("link"));
-        const QByteArray written = ReadFile(damaged);
+        QCOMPARE(QFileInfo(settings).isSymLink(), damage.startsWith(u"link"));
+        const QByteArray written = ReadFile(settings);
         QVERIFY(written.size() > original.size() && written.startsWith(original));
-        QCOMPARE(
-            setting(QStringLiteral("Settings"), QStringLiteral("CorvelleVersion")), QStringLiteral(BRIMVAULT_VERSION));
+        QCOMPARE(GetSetting(AppTitle(), u"Settings"_s, u"CorvelleVersion"_s), QStringLiteral(BRIMVAULT_VERSION));
     }
 
     void settingsFolderCannotBeMade_data()
@@ -198,32 +171,27 @@ private Q_SLOTS:
         QTest::addColumn<QString>("location"); // relative to the test's tree; empty: as the system gives it
         QTest::addColumn<QStringList>("unset");
         QTest::addColumn<QString>("expectedFile"); // where the settings must then be; empty: the program stops
-
-        QTest::newRow("below a regular file") << QStringLiteral("blocker/settings") << QStringList() << QString();
-        QTest::newRow("no HOME, folder given") << QStringLiteral("settings") << QStringList {QStringLiteral("HOME")}
-                                               << QStringLiteral("settings/Brimvault.ini");
+        QTest::newRow("below a regular file") << u"blocker/settings"_s << QStringList() << QString();
+        QTest::newRow("no HOME, folder given")
+            << u"settings"_s << QStringList {u"HOME"_s} << u"settings/Brimvault.ini"_s;
         QTest::newRow("no HOME, only XDG_CONFIG_HOME")
-            << QString() << QStringList {QStringLiteral("HOME"), QStringLiteral("BRIMVAULT_SETTINGS_DIR")}
-            << QStringLiteral("xdg-config/Brimvault/Brimvault.ini");
+            << QString() << QStringList {u"HOME"_s, u"BRIMVAULT_SETTINGS_DIR"_s}
+            << u"xdg-config/Brimvault/Brimvault.ini"_s;
     }
-
     void settingsFolderCannotBeMade()
     {
         QFETCH(QString, location);
-        QFETCH(QStringList, unset);
         QFETCH(QString, expectedFile);
-
-        const QString blocker = m_env->path(QStringLiteral("blocker"));
+        const QString blocker = m_env->path(u"blocker"_s);
         QVERIFY(WriteFile(blocker, "the user's own file\n"));
         ProgramRunOptions options;
+        QFETCH(QStringList, unset);
         options.unsetEnvironment = unset;
         if (!location.isEmpty())
-            options.setEnvironment.insert(QStringLiteral("BRIMVAULT_SETTINGS_DIR"), m_env->path(location));
+            options.setEnvironment.insert(u"BRIMVAULT_SETTINGS_DIR"_s, m_env->path(location));
         // Everything a program might derive from the home folder stays inside the tree.
-        for (const char* kind : {"CONFIG", "DATA", "CACHE", "STATE"}) {
-            options.setEnvironment.insert(QStringLiteral("XDG_%1_HOME").arg(QLatin1String(kind)),
-                m_env->path(QStringLiteral("xdg-") + QString::fromLatin1(kind).toLower()));
-        }
+        for (const QString& kind : {u"CONFIG"_s, u"DATA"_s, u"CACHE"_s, u"STATE"_s})
+            options.setEnvironment.insert(u"XDG_"_s + kind + u"_HOME"_s, m_env->path(u"xdg-"_s + kind.toLower()));
 
         const ProgramOutcome outcome = run(options);
 
@@ -233,8 +201,7 @@ private Q_SLOTS:
             return;
         }
         VERIFY_OUTCOME(outcome.showedWindow(), outcome);
-        QVERIFY2(ReadFile(m_env->path(expectedFile)).contains("QuilletVersion=" BRIMVAULT_VERSION),
-            qPrintable(expectedFile));
+        QVERIFY(ReadFile(m_env->path(expectedFile)).contains("QuilletVersion=" BRIMVAULT_VERSION));
     }
 
     // The other games are still shown; installing a package tells why it cannot be done.
@@ -242,44 +209,37 @@ private Q_SLOTS:
     {
         QTest::addColumn<QString>("blocked"); // the path, relative to the tree, that is not a folder
         QTest::addColumn<QString>("damage");
-
-        QTest::newRow("games folder is a file") << QStringLiteral("commonappdata/Brimvault") << QStringLiteral("text");
-        QTest::newRow("games folder is a named pipe")
-            << QStringLiteral("commonappdata/Brimvault") << QStringLiteral("pipe");
-        QTest::newRow("application data folder is a file") << QStringLiteral("commonappdata") << QStringLiteral("text");
+        QTest::newRow("games folder is a file") << u"commonappdata/Brimvault"_s << u"text"_s;
+        QTest::newRow("games folder is a named pipe") << u"commonappdata/Brimvault"_s << u"pipe"_s;
+        QTest::newRow("application data folder is a file") << u"commonappdata"_s << u"text"_s;
     }
-
     void gamesFolderIsNotAFolder()
     {
         QFETCH(QString, blocked);
         QFETCH(QString, damage);
-
         const QString blockedPath = m_env->path(blocked);
-        QVERIFY(::damage(blockedPath, damage));
         const QString added = userGame();
-        QVERIFY(WriteFile(m_env->settingsFile(), addedGameSettings(added)));
-        const QString solitaire = m_env->path(QStringLiteral("windows/sol.exe"));
-        QVERIFY(QFile::copy(PeFixture(QStringLiteral("nores32.exe")), solitaire));
+        const QString solitaire = m_env->path(u"windows/sol.exe"_s);
+        QVERIFY(spoil(blockedPath, damage) && WriteFile(m_env->settingsFile(), addedGameSettings(added))
+            && QFile::copy(PeFixture(u"nores32.exe"_s), solitaire));
         const QMap<QString, QByteArray> untouched = snapshotOf(blockedPath);
 
         const ProgramOutcome outcome = run();
 
-        const QStringList data = outcome.items(QStringLiteral("data"));
+        const QStringList data = outcome.items(u"data"_s);
         VERIFY_OUTCOME(outcome.showedWindow() && data.size() == 3, outcome);
-        VERIFY_OUTCOME(data.first().startsWith(QStringLiteral("http://127.0.0.1:9/")), outcome);
+        VERIFY_OUTCOME(data.first().startsWith(u"http://127.0.0.1:9/"_s), outcome);
         VERIFY_OUTCOME(data.contains(solitaire) && data.contains(added), outcome);
 
-        const QString source = m_env->path(QStringLiteral("sources/Star Quest/StarQuest.exe"));
-        QVERIFY(WriteFile(source, ReadFile(PeFixture(QStringLiteral("multi32.exe")))));
-        const QString package = m_env->path(QStringLiteral("StarQuest.bvxpak"));
+        const QString source = m_env->path(u"sources/Star Quest"_s);
+        const QString package = m_env->path(u"StarQuest.bvxpak"_s);
         QString output;
-        QCOMPARE(RunService({QStringLiteral("--pack"), QFileInfo(source).absolutePath(), package}, &output), 0);
-        QVERIFY2(RunService({QStringLiteral("-I"), package}, &output) > 0, qPrintable(output));
-        QVERIFY2(output.contains(QStringLiteral("cannot be created")), qPrintable(output));
+        QVERIFY(WriteFile(source + u"/StarQuest.exe"_s, ReadFile(PeFixture(u"multi32.exe"_s))));
+        QCOMPARE(RunService({u"--pack"_s, source, package}, &output), 0);
+        QVERIFY2(
+            RunService({u"-I"_s, package}, &output) > 0 && output.contains(u"cannot be created"_s), qPrintable(output));
         QCOMPARE(snapshotOf(blockedPath), untouched);
-        QCOMPARE(
-            GetSetting(AppTitle(), QStringLiteral("Commands"), QStringLiteral("NewGameInstalled"), QStringLiteral("0")),
-            QStringLiteral("0"));
+        QCOMPARE(GetSetting(AppTitle(), u"Commands"_s, u"NewGameInstalled"_s, u"0"_s), u"0"_s);
     }
 
     // A game added by hand whose file is gone or damaged is still listed, with the no-icon picture.
@@ -289,70 +249,57 @@ private Q_SLOTS:
         for (const char* damage : {"removed", "empty", "garbage", "folder", "pipe"})
             QTest::newRow(damage) << QString::fromLatin1(damage);
     }
-
     void addedGameFileDamaged()
     {
         QFETCH(QString, damage);
-
         const QString game = userGame();
-        QVERIFY(::damage(game, damage));
-        QVERIFY(WriteFile(m_env->settingsFile(), addedGameSettings(game)));
-        const QMap<QString, QByteArray> untouched = SnapshotTree(m_env->path(QStringLiteral("personal")));
+        QVERIFY(spoil(game, damage) && WriteFile(m_env->settingsFile(), addedGameSettings(game)));
+        const QMap<QString, QByteArray> untouched = SnapshotTree(m_env->path(u"personal"_s));
 
         const ProgramOutcome outcome = run();
 
         VERIFY_OUTCOME(outcome.showedWindow(), outcome);
-        const qsizetype index = outcome.items(QStringLiteral("data")).indexOf(game);
-        QCOMPARE(outcome.items(QStringLiteral("picture")).value(index), QStringLiteral("no-icon"));
-        QCOMPARE(outcome.items(QStringLiteral("caption")).value(index), QStringLiteral("chess"));
-        QCOMPARE(SnapshotTree(m_env->path(QStringLiteral("personal"))), untouched);
+        const qsizetype index = outcome.items(u"data"_s).indexOf(game);
+        QCOMPARE(outcome.items(u"picture"_s).value(index), u"no-icon"_s);
+        QCOMPARE(outcome.items(u"caption"_s).value(index), u"chess"_s);
+        QCOMPARE(SnapshotTree(m_env->path(u"personal"_s)), untouched);
     }
 
     // Every queued icon is made once, from the executable when the cache cannot be used, and the queue empties.
     void iconCacheCannotBeWritten_data()
     {
+        QTest::addColumn<bool>("folder"); // the icons folder damaged, else the arcade game's cache file
         QTest::addColumn<QString>("damage");
-        for (const char* damage : {"folder is a file", "folder is a pipe", "folder links through a file",
-                 "cache file is a pipe", "cache file is a folder", "cache file is a link", "cache file is garbage"})
-            QTest::newRow(damage) << QString::fromLatin1(damage);
+        QTest::newRow("folder is a file") << true << u"text"_s;
+        QTest::newRow("folder is a pipe") << true << u"pipe"_s;
+        QTest::newRow("folder links through a file") << true << u"link blocker/Icons"_s;
+        QTest::newRow("cache file is a pipe") << false << u"pipe"_s;
+        QTest::newRow("cache file is a folder") << false << u"folder"_s;
+        QTest::newRow("cache file is a link") << false << u"link personal/notes.txt"_s;
+        QTest::newRow("cache file is garbage") << false << u"garbage"_s;
     }
-
     void iconCacheCannotBeWritten()
     {
+        QFETCH(bool, folder);
         QFETCH(QString, damage);
-
-        const QString withIcon = DataFolders::GamesFolder() + QStringLiteral("Arcade/Arcade.exe");
-        const QString withoutIcon = DataFolders::GamesFolder() + QStringLiteral("Plain/Plain.exe");
-        QVERIFY(WriteFile(withIcon, ReadFile(PeFixture(QStringLiteral("multi32.exe")))));
-        QVERIFY(WriteFile(withoutIcon, ReadFile(PeFixture(QStringLiteral("nores32.exe")))));
+        const QString withIcon = DataFolders::GamesFolder() + u"Arcade/Arcade.exe"_s;
+        const QString withoutIcon = DataFolders::GamesFolder() + u"Plain/Plain.exe"_s;
         const QString icons = QDir::cleanPath(DataFolders::IconsFolder());
         const QString cacheFile = FileSystemPath(IconCacheFile(DataFolders::IconsFolder(), withIcon));
-        const QString notes = m_env->path(QStringLiteral("personal/notes.txt"));
-        QVERIFY(WriteFile(notes, "my notes\n") && WriteFile(m_env->path(QStringLiteral("blocker")), "a file\n"));
-        if (damage == QStringLiteral("folder is a file"))
-            QVERIFY(WriteFile(icons, "not a folder\n"));
-        else if (damage == QStringLiteral("folder is a pipe"))
-            QVERIFY(MakeNamedPipe(icons));
-        else if (damage == QStringLiteral("folder links through a file"))
-            QVERIFY(QFile::link(m_env->path(QStringLiteral("blocker/Icons")), icons));
-        else if (damage == QStringLiteral("cache file is a pipe"))
-            QVERIFY(MakeNamedPipe(cacheFile));
-        else if (damage == QStringLiteral("cache file is a folder"))
-            QVERIFY(QDir().mkpath(cacheFile));
-        else if (damage == QStringLiteral("cache file is a link"))
-            QVERIFY(QDir().mkpath(icons) && QFile::link(notes, cacheFile));
-        else
-            QVERIFY(WriteFile(cacheFile, garbage(4096)));
+        const QString notes = m_env->path(u"personal/notes.txt"_s);
+        QVERIFY(WriteFile(withIcon, ReadFile(PeFixture(u"multi32.exe"_s)))
+            && WriteFile(withoutIcon, ReadFile(PeFixture(u"nores32.exe"_s))) && WriteFile(notes, "my notes\n")
+            && WriteFile(m_env->path(u"blocker"_s), "a file\n") && spoil(folder ? icons : cacheFile, damage));
         const QMap<QString, QByteArray> untouched = snapshotOf(icons);
 
         const ProgramOutcome outcome = run();
 
         VERIFY_OUTCOME(outcome.showedWindow(), outcome);
-        const QStringList data = outcome.items(QStringLiteral("data"));
-        const QStringList pictures = outcome.items(QStringLiteral("picture"));
-        QCOMPARE(pictures.value(data.indexOf(withIcon)), QStringLiteral("picture"));
-        QCOMPARE(pictures.value(data.indexOf(withoutIcon)), QStringLiteral("no-icon"));
-        if (damage == QStringLiteral("cache file is garbage"))
+        const QStringList data = outcome.items(u"data"_s);
+        const QStringList pictures = outcome.items(u"picture"_s);
+        QCOMPARE(pictures.value(data.indexOf(withIcon)), u"picture"_s);
+        QCOMPARE(pictures.value(data.indexOf(withoutIcon)), u"no-icon"_s);
+        if (damage == u"garbage")
             QVERIFY(ReadFile(cacheFile).startsWith(QByteArray("\0\0\1\0", 4)));
         else
             QCOMPARE(snapshotOf(icons), untouched);
@@ -369,39 +316,34 @@ private Q_SLOTS:
             {"intact", "removed", "empty", "garbage", "folder", "pipe", "repeated number", "no charset", "huge"})
             QTest::newRow(damage) << QString::fromLatin1(damage);
     }
-
     void chosenLanguageFileDamaged()
     {
         QFETCH(QString, damage);
-
         const ProgramOutcome first = run();
         VERIFY_OUTCOME(first.showedWindow(), first);
-        QVERIFY(SaveSetting(AppTitle(), QStringLiteral("LocaleSettings"), QStringLiteral("LngFileName"),
-            QStringLiteral("Brimvault_Russian.lng")));
-        QVERIFY(SaveSetting(
-            AppTitle(), QStringLiteral("LocaleSettings"), QStringLiteral("LngNik"), QStringLiteral("RUSSIAN")));
-        const QString file = m_program->filePath(QStringLiteral("Brimvault_Russian.lng"));
+        QVERIFY(SaveSetting(AppTitle(), u"LocaleSettings"_s, u"LngFileName"_s, u"Brimvault_Russian.lng"_s)
+            && SaveSetting(AppTitle(), u"LocaleSettings"_s, u"LngNik"_s, u"RUSSIAN"_s));
+        const QString file = m_program->filePath(u"Brimvault_Russian.lng"_s);
         const QByteArray russian = ReadFile(file);
-        if (damage == QStringLiteral("repeated number"))
+        if (damage == u"repeated number")
             QVERIFY(WriteFile(file, russian + "\r\n@1010=\xc4\xe5\xe9\xf1\xf2\xe2\xe8\xff\r\n"));
-        else if (damage == QStringLiteral("no charset"))
+        else if (damage == u"no charset")
             QVERIFY(WriteFile(file, QByteArray(russian).replace("#charset=204", "; no charset")));
-        else if (damage == QStringLiteral("huge"))
+        else if (damage == u"huge")
             QVERIFY(WriteFile(file, "#language=Russian\r\n#charset=204\r\n" + QByteArray(17 * 1024 * 1024, ';')));
         else
-            QVERIFY(::damage(file, damage));
-        const QMap<QString, QByteArray> settingsBefore = SnapshotTree(m_env->path(QStringLiteral("settings")));
+            QVERIFY(spoil(file, damage));
+        const QMap<QString, QByteArray> settingsBefore = SnapshotTree(m_env->path(u"settings"_s));
 
         const ProgramOutcome outcome = run();
 
         VERIFY_OUTCOME(outcome.showedWindow(), outcome);
-        const bool english = damage != QStringLiteral("intact");
-        QCOMPARE(outcome.window->value(QStringLiteral("actions")).toString() == QStringLiteral("Actions"), english);
-        QCOMPARE(outcome.items(QStringLiteral("caption")).value(0) == QStringLiteral("Online games"), english);
-        QCOMPARE(outcome.window->value(QStringLiteral("menu")).toArray().contains(QStringLiteral("Add game file...")),
-            english);
-        QCOMPARE(outcome.window->value(QStringLiteral("title")).toString(), QStringLiteral("Brimvault"));
-        QCOMPARE(SnapshotTree(m_env->path(QStringLiteral("settings"))), settingsBefore);
+        const bool english = damage != u"intact";
+        QCOMPARE(outcome.window->value(u"actions"_s).toString() == u"Actions"_s, english);
+        QCOMPARE(outcome.items(u"caption"_s).value(0) == u"Online games"_s, english);
+        QCOMPARE(outcome.window->value(u"menu"_s).toArray().contains(u"Add game file..."_s), english);
+        QCOMPARE(outcome.window->value(u"title"_s).toString(), u"Brimvault"_s);
+        QCOMPARE(SnapshotTree(m_env->path(u"settings"_s)), settingsBefore);
     }
 
     // A registry entry that names a missing or broken library is repaired by registering the file beside the
@@ -411,48 +353,40 @@ private Q_SLOTS:
         QTest::addColumn<QString>("registered"); // the library the registry names for Velloran; empty: as made
         QTest::addColumn<QString>("library"); // what lies beside the program as Velloran's file
         QTest::addColumn<QString>("failing"); // the component named on standard error; empty: the program runs
-
-        const QString intact = QStringLiteral("intact");
-        QTest::newRow("registered file deleted") << QStringLiteral("removed") << intact << QString();
-        QTest::newRow("registered file is text") << QStringLiteral("text") << intact << QString();
-        QTest::newRow("registered file cut off") << QStringLiteral("truncated 50") << intact << QString();
-        QTest::newRow("registry is garbage") << QStringLiteral("garbage registry") << intact << QString();
-        QTest::newRow("registry is a named pipe")
-            << QStringLiteral("pipe registry") << intact << QStringLiteral("Quillet");
+        const QString intact = u"intact"_s;
+        QTest::newRow("registered file deleted") << u"removed"_s << intact << QString();
+        QTest::newRow("registered file is text") << u"text"_s << intact << QString();
+        QTest::newRow("registered file cut off") << u"truncated 50"_s << intact << QString();
+        QTest::newRow("registry is garbage") << u"garbage registry"_s << intact << QString();
+        QTest::newRow("registry is a named pipe") << u"pipe registry"_s << intact << u"Quillet"_s;
         for (const char* library : {"removed", "text", "empty", "truncated 2", "truncated 50", "truncated 95",
                  "no entry point", "folder", "pipe"})
-            QTest::newRow(library) << QString() << QString::fromLatin1(library) << QStringLiteral("Velloran");
-        QTest::newRow("registered file deleted, library cut off")
-            << QStringLiteral("removed") << QStringLiteral("truncated 50") << QStringLiteral("Velloran");
+            QTest::newRow(library) << QString() << QString::fromLatin1(library) << u"Velloran"_s;
+        QTest::newRow("registered file deleted, library cut off") << u"removed"_s << u"truncated 50"_s << u"Velloran"_s;
     }
-
     void componentLibraryDamaged()
     {
         QFETCH(QString, registered);
         QFETCH(QString, library);
         QFETCH(QString, failing);
-
         const ProgramOutcome first = run();
         VERIFY_OUTCOME(first.showedWindow(), first);
-        const QString progId = QStringLiteral("Velloran.clsVersion");
-        const QString fileName = CompanionComponentFile(QStringLiteral("Velloran"));
+        const QString progId = u"Velloran.clsVersion"_s;
+        const QString fileName = CompanionComponentFile(u"Velloran"_s);
         const QString velloran = m_program->filePath(fileName);
         const QByteArray real = ReadFile(velloran);
-        QVERIFY(!real.isEmpty());
-
-        if (registered.endsWith(QStringLiteral(" registry"))) {
-            QVERIFY(damage(ComponentRegistryPath(), registered.section(u' ', 0, 0)));
+        if (registered.endsWith(u" registry")) {
+            QVERIFY(spoil(ComponentRegistryPath(), registered.section(u' ', 0, 0)));
         } else if (!registered.isEmpty()) {
-            const QString elsewhere = m_env->path(QStringLiteral("elsewhere/") + fileName);
-            QVERIFY(damage(elsewhere, registered, real) && RegisterProgIds({progId}, elsewhere));
+            const QString elsewhere = m_env->path(u"elsewhere/"_s + fileName);
+            QVERIFY(spoil(elsewhere, registered, real) && RegisterProgIds({progId}, elsewhere));
         }
-        const QByteArray registryBefore
-            = registered.startsWith(QStringLiteral("garbage")) ? ReadFile(ComponentRegistryPath()) : QByteArray();
-        if (library == QStringLiteral("no entry point"))
+        const QByteArray registryBefore = registered.startsWith(u"garbage") ? ReadFile(ComponentRegistryPath()) : "";
+        if (library == u"no entry point")
             QVERIFY(QFile::remove(velloran)
                 && QFile::copy(QStringLiteral(BRIMVAULT_FIXTURE_DIR "/NoEntryPoint/") + fileName, velloran));
         else
-            QVERIFY(damage(velloran, library, real));
+            QVERIFY(!real.isEmpty() && spoil(velloran, library, real));
         const QByteArray settingsBefore = ReadFile(m_env->settingsFile());
 
         const ProgramOutcome outcome = run();
@@ -460,8 +394,9 @@ private Q_SLOTS:
         // Versions only change when a component changes: the user's settings stay as they were either way.
         QCOMPARE(ReadFile(m_env->settingsFile()), settingsBefore);
         if (!failing.isEmpty()) {
-            VERIFY_OUTCOME(outcome.stoppedWithAdminMessage(), outcome);
-            VERIFY_OUTCOME(outcome.standardError.contains(failing + QStringLiteral(" cannot be made usable")), outcome);
+            VERIFY_OUTCOME(outcome.stoppedWithAdminMessage()
+                    && outcome.standardError.contains(failing + u" cannot be made usable"_s),
+                outcome);
             return;
         }
         VERIFY_OUTCOME(outcome.showedWindow(), outcome);
