@@ -2,6 +2,7 @@
 #include "MainWindowFixture.h"
 #include "PromptRecorder.h"
 #include "TestEnvironment.h"
+#include "TestFiles.h"
 
 #include "i18n/ApplyLanguage.h"
 #include "i18n/frmLanguages.h"
@@ -15,6 +16,7 @@
 #include <QAction>
 #include <QComboBox>
 #include <QFileDialog>
+#include <QFileInfo>
 #include <QLabel>
 #include <QMenu>
 #include <QMessageBox>
@@ -264,6 +266,29 @@ private Q_SLOTS:
         QCOMPARE(m_prompts->inputs.value(0).defaultText, u"My Puzzle"_s);
         QCOMPARE(list->labN(index).text(), u"Evening Puzzle"_s);
         QCOMPARE(setting(u"FilesNames"_s, u"FileName1"_s), u"Evening Puzzle"_s);
+    }
+
+    // One game goes; the rest stay where they were, with no rebuild.
+    void removingOneGameKeepsTheRest()
+    {
+        BuildSampleLibrary(*m_env);
+        const QString solitaire = m_env->path(u"windows/sol.exe"_s);
+        QVERIFY(WriteFile(solitaire));
+        auto window = openWindow();
+        QSignalSpy rebuilt(window.get(), &frmMain::listRebuilt);
+        SimpleListView* list = window->ListView1();
+        QStringList games = column(list, true);
+        const int index = int(games.indexOf(solitaire));
+        QVERIFY(index > 0 && index < games.size() - 1);
+        QTest::mouseClick(list, Qt::LeftButton, {}, list->imgN(index).geometry().center().toPoint());
+        m_prompts->answer = PromptAnswer::Yes;
+        window->menuItem(u"mnuRemoveFile"_s)->trigger();
+        games.removeAt(index);
+        QCOMPARE(column(list, true), games);
+        QCOMPARE(list->currentIndex(), index);
+        QCOMPARE(rebuilt.count(), 0);
+        // A Windows game is only taken off the list; its file stays.
+        QVERIFY(QFileInfo::exists(solitaire));
     }
 
     void closingStopsDiscoveryAndTheIconBuilder()
