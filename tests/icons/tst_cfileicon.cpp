@@ -3,9 +3,14 @@
 #include "TestEnvironment.h"
 #include "TestFiles.h"
 #include "TestSuite.h"
+#include "icons/IconImageDecoder.h"
 #include "icons/cFileIcon.h"
 
+#include <QImage>
+#include <QtEndian>
+
 using namespace Brimvault;
+using namespace Qt::StringLiterals;
 
 namespace {
 
@@ -13,13 +18,49 @@ namespace {
 const QList<IconImage> ThreeImages {{16, 16, 16, 1, 4, BlankBitmap(16, 16, 4)},
     {32, 32, 0, 1, 8, BlankBitmap(32, 32, 8)}, {48, 48, 0, 1, 32, BlankBitmap(48, 48, 32)}};
 
-QList<quint32> offsets(const cFileIcon& icon)
+// What AddImage makes: header, black palette (but white for colour 1 of a 1-bit image) and zero bits, `size` bytes.
+QByteArray blank(int side, int bitCount, int size)
 {
-    QList<quint32> out;
-    for (int i = 1; i <= icon.ImageCount(); ++i)
-        out.append(icon.entry(i).dwImageOffset);
-    return out;
+    QByteArray image = BlankBitmap(side, side, bitCount).left(16).leftJustified(size, '\0');
+    return bitCount == 1 ? image.replace(44, 3, "\xff\xff\xff") : image;
 }
+
+// A new object's header says type 0.
+QByteArray added(const QList<IconImage>& images)
+{
+    return Patched<quint16>(BuildIconFile(images), 2, 0);
+}
+
+// An icon bitmap: the 40-byte header with biClrUsed = colours, then palette, colour rows and mask rows (both
+// bottom-up) given in hex.
+QByteArray bitmap(int width, int height, int bitCount, int colours, const char* hex)
+{
+    QByteArray out = BlankBitmap(width, height, bitCount).left(40);
+    qToLittleEndian<quint32>(quint32(colours), out.data() + 32);
+    return out + QByteArray::fromHex(hex);
+}
+
+QByteArray withField(QByteArray image, int offset, qint32 value)
+{
+    qToLittleEndian<qint32>(value, image.data() + offset);
+    return image;
+}
+
+// Pixels as AARRGGBB, top row first, rows split by " | "; "" for a null picture.
+QString pixels(const QImage& picture)
+{
+    QStringList rows;
+    for (int y = 0; y < picture.height(); ++y) {
+        QStringList row;
+        for (int x = 0; x < picture.width(); ++x)
+            row.append(u"%1"_s.arg(picture.pixel(x, y), 8, 16, QLatin1Char('0')));
+        rows.append(row.join(u' '));
+    }
+    return rows.join(u" | "_s);
+}
+
+// Rows 110 / 010 (bottom / top) in black and white; the mask shows the screen through the bottom row's last pixel.
+const QByteArray OneBit = bitmap(3, 2, 1, 0, "00000000ffffff00 c0000000 40000000 20000000 00000000");
 
 } // namespace
 
@@ -32,8 +73,16 @@ private:
 
     QString written(const QByteArray& bytes)
     {
-        const QString path = m_env.path(QStringLiteral("%1.ico").arg(++m_files));
+        const QString path = m_env.path(u"%1.ico"_s.arg(++m_files));
         return WriteFile(path, bytes) ? path : QString();
+    }
+
+    cFileIcon loaded(const QByteArray& iconFile)
+    {
+        cFileIcon icon;
+        if (!icon.LoadIcon(written(iconFile)))
+            qFatal("cannot load an icon");
+        return icon;
     }
 
 private Q_SLOTS:
@@ -43,20 +92,16 @@ private Q_SLOTS:
         QTest::addColumn<QString>("message");
         QTest::addColumn<int>("countAfter");
         const QByteArray one = BuildIconFile(ThreeImages.mid(0, 1));
-        const QString notIcon = QStringLiteral("File is not icon type (idType <> IMAGE_ICON)");
-        const QString reserved = QStringLiteral("File is not icon type (reserved member is 0)");
-        const QString badImages = QStringLiteral("Icon Images Array is Corrupt.");
+        const QString notIcon = u"File is not icon type (idType <> IMAGE_ICON)"_s;
+        const QString badImages = u"Icon Images Array is Corrupt."_s;
         QTest::newRow("no images") << written({"\0\0\1\0\0\0", 6}) << "Icon contains no images." << 0;
         QTest::newRow("negative count") << written({"\0\0\1\0\xff\xff", 6}) << "Icon contains no images." << -1;
-        QTest::newRow("reserved set") << written({"\1\0\1\0\1\0", 6}) << reserved << 1;
+        QTest::newRow("reserved set") << written({"\1\0\1\0\1\0", 6}) << "File is not icon type (reserved member is 0)"
+                                      << 1;
         QTest::newRow("cursor") << written({"\0\0\2\0\1\0", 6}) << notIcon << 1;
-        QTest::newRow("png named .ico") << written({"\x89PNG\r\n\x1a\n", 8}) << reserved << 0x0A0D;
-        QTest::newRow("empty file") << written({}) << notIcon << 0;
-        QTest::newRow("missing file") << m_env.path(QStringLiteral("nowhere/none.ico")) << notIcon << 0;
-        QTest::newRow("a folder") << m_env.root() << notIcon << 0;
+        QTest::newRow("missing file") << m_env.path(u"nowhere/none.ico"_s) << notIcon << 0;
         QTest::newRow("directory short") << written(Patched<quint16>(one.left(22), 4, 2))
                                          << "Icon Directory Array is Corrupt." << 0;
-        QTest::newRow("image short") << written(one.chopped(10)) << badImages << 0;
         QTest::newRow("size beyond file") << written(Patched<quint32>(one, 14, 0xFFFFFFF0u)) << badImages << 0;
         QTest::newRow("offset beyond file") << written(Patched<quint32>(one, 18, 0x7FFFFFF0u)) << badImages << 0;
     }
@@ -81,12 +126,10 @@ private Q_SLOTS:
         QList<IconImage> many;
         for (int i = 0; i < 5000; ++i)
             many.append({1, 1, 2, 1, 1, Patched<quint16>(BlankBitmap(1, 1, 1), 40, quint16(i))});
-        QTest::newRow("three images") << BuildIconFile(ThreeImages);
         QTest::newRow("5,000 images") << BuildIconFile(many);
         QTest::newRow("image across 64 KiB")
-            << BuildIconFile(ThreeImages.mid(1) + QList<IconImage> {{255, 255, 0, 1, 32, BlankBitmap(255, 255, 32)}});
-        QTest::newRow("icotool, five images with PNG") << ReadFile(IconInput(QStringLiteral("main.ico")));
-        QTest::newRow("icotool, 32-bit") << ReadFile(IconInput(QStringLiteral("other.ico")));
+            << BuildIconFile(ThreeImages + QList<IconImage> {{255, 255, 0, 1, 32, BlankBitmap(255, 255, 32)}});
+        QTest::newRow("icotool, five images with PNG") << ReadFile(IconInput(u"main.ico"_s));
     }
 
     void packedFileRoundTripsByteForByte()
@@ -94,11 +137,10 @@ private Q_SLOTS:
         QFETCH(QByteArray, bytes);
         cFileIcon icon;
         QVERIFY(icon.LoadIcon(written(bytes)));
-        const QString copy = m_env.path(QStringLiteral("copy.ico"));
+        const QString copy = m_env.path(u"copy.ico"_s);
         QVERIFY(icon.SaveIcon(copy));
         QCOMPARE(icon.Filename(), copy);
         QCOMPARE(ReadFile(copy), bytes);
-        QCOMPARE(icon.toIconFile(), bytes);
     }
 
     void loadKeepsOffsetsAsGiven()
@@ -107,162 +149,234 @@ private Q_SLOTS:
         bytes.insert(22, QByteArray(200000, 'x'));
         cFileIcon icon;
         QVERIFY(icon.LoadIcon(written(Patched<quint32>(bytes, 18, 200022))));
-        QCOMPARE(offsets(icon), QList<quint32> {200022});
+        QCOMPARE(icon.entry(1).dwImageOffset, 200022u);
         QCOMPARE(icon.imageBytes(1), BlankBitmap(16, 16, 4));
     }
 
-    void queries_data()
-    {
-        QTest::addColumn<int>("colourCount");
-        QTest::addColumn<int>("bitCount");
-        QTest::addColumn<qint64>("expected");
-        QTest::newRow("32-bit") << 0 << 32 << qint64(-1);
-        QTest::newRow("8-bit") << 0 << 8 << qint64(256);
-        QTest::newRow("24-bit") << 0 << 24 << qint64(16777216);
-        QTest::newRow("bit count 0") << 0 << 0 << qint64(1);
-        QTest::newRow("count wins over bits") << 2 << 32 << qint64(2);
-    }
-
+    // The last image too.
     void queries()
     {
-        QFETCH(int, colourCount);
-        QFETCH(int, bitCount);
-        QFETCH(qint64, expected);
+        QList<IconImage> images;
+        for (const auto& [colours, bits] : QList<std::pair<int, int>> {{0, 32}, {0, 8}, {0, 24}, {0, 0}, {2, 32}})
+            images.append({24, 16, quint8(colours), 1, quint16(bits), BlankBitmap(24, 16, 8)});
         cFileIcon icon;
-        QVERIFY(icon.LoadIcon(
-            written(BuildIconFile({{24, 16, quint8(colourCount), 1, quint16(bitCount), BlankBitmap(24, 16, 8)}}))));
-        QCOMPARE(icon.ImageColourCount(1), expected);
-        QCOMPARE(QList<int>({icon.ImageWidth(1), icon.ImageHeight(1), icon.ImageSize(1)}), QList<int>({24, 16, 1512}));
-        for (int outside : {0, 2}) {
+        QVERIFY(icon.LoadIcon(written(BuildIconFile(images))));
+        QList<qint64> counts;
+        for (int i = 1; i <= 5; ++i)
+            counts.append(icon.ImageColourCount(i));
+        QCOMPARE(counts, QList<qint64>({-1, 256, 16777216, 1, 2}));
+        QCOMPARE(QList<int>({icon.ImageWidth(5), icon.ImageHeight(5), icon.ImageSize(5)}), QList<int>({24, 16, 1512}));
+        for (int outside : {0, 6}) {
             const NumberedError error = Raised([&] { icon.ImageColourCount(outside); });
             QCOMPARE(error.number(), SubscriptOutOfRange);
-            QVERIFY(error.source().endsWith(QStringLiteral(".cFileIcon")));
+            QVERIFY(error.source().endsWith(u".cFileIcon"_s));
         }
     }
 
     void saveErrors()
     {
         cFileIcon icon;
-        NumberedError error = Raised([&] { icon.SaveIcon(); });
-        QCOMPARE(error.number(), 0x8004041Bu);
-        QCOMPARE(error.message(), QStringLiteral("No filename specified."));
-        QCOMPARE(error.source(), ErrorSource(QStringLiteral("cFileIcon")));
-        error = Raised([&] { icon.SaveIcon(m_env.path(QStringLiteral("empty.ico"))); });
-        QCOMPARE(error.number(), 0x8004041Cu);
-        QCOMPARE(error.message(), QStringLiteral("Icon contains no images."));
-        QVERIFY(!QFile::exists(m_env.path(QStringLiteral("empty.ico"))));
+        const auto failure = [&icon](const QString& path) -> QString {
+            const NumberedError error = Raised([&] { icon.SaveIcon(path); });
+            return QString::number(error.number(), 16) + u' ' + error.message();
+        };
+        QCOMPARE(failure({}), u"8004041b No filename specified."_s);
+        QCOMPARE(failure(m_env.path(u"empty.ico"_s)), u"8004041c Icon contains no images."_s);
+        QVERIFY(!QFile::exists(m_env.path(u"empty.ico"_s)));
         icon.AddImage(16, 16, 2);
-        error = Raised([&] { icon.SaveIcon(m_env.path(QStringLiteral("no/such/folder/x.ico"))); });
-        QCOMPARE(error.number(), 0x8004041Cu);
-        QCOMPARE(error.message(), QStringLiteral("Couldn't open file for writing."));
-        error = Raised([&] { icon.SaveIcon(QStringLiteral("/dev/full")); });
-        QCOMPARE(error.number(), 0x8004041Du);
-        QCOMPARE(error.message(), QStringLiteral("General failure writing icon."));
+        QCOMPARE(failure(m_env.path(u"no/such/folder/x.ico"_s)), u"8004041c Couldn't open file for writing."_s);
+        QCOMPARE(failure(u"/dev/full"_s), u"8004041d General failure writing icon."_s);
     }
 
-    void addImage_data()
+    void edits_data()
     {
-        QTest::addColumn<int>("side");
-        QTest::addColumn<int>("colours");
-        QTest::addColumn<int>("bitCount");
-        QTest::addColumn<int>("storedCount");
-        QTest::addColumn<int>("size");
-        // 40 + 4 × colours + colour rows + mask rows.
-        QTest::newRow("32 × 32, 16") << 32 << 16 << 4 << 16 << 744;
-        QTest::newRow("2") << 16 << 2 << 1 << 2 << 40 + 8 + 64 + 64;
-        QTest::newRow("256") << 16 << 256 << 8 << 0 << 40 + 1024 + 256 + 64;
-        QTest::newRow("other") << 16 << 0 << 24 << 0 << 40 + 0 + 768 + 64;
-        QTest::newRow("other, colours counted") << 16 << 5 << 24 << 0 << 40 + 20 + 768 + 64;
+        QTest::addColumn<QByteArray>("start"); // an icon file loaded first, then saved under its name
+        QTest::addColumn<QList<QList<int>>>("adds"); // side, colours
+        QTest::addColumn<int>("remove");
+        QTest::addColumn<QByteArray>("expected");
+        const QByteArray three = BuildIconFile(ThreeImages);
+        const IconImage two {16, 16, 2, 1, 1, blank(16, 1, 40 + 8 + 64 + 64)};
+        const IconImage sixteen {32, 32, 16, 1, 4, blank(32, 4, 744)};
+        QTest::newRow("add 1 × 1, 2: rows of one bit take a word")
+            << QByteArray() << QList<QList<int>> {{1, 2}} << 0 << added({{1, 1, 2, 1, 1, blank(1, 1, 40 + 8 + 4 + 4)}});
+        QTest::newRow("add other, colours counted") << QByteArray() << QList<QList<int>> {{16, 5}} << 0
+                                                    << added({{16, 16, 0, 1, 24, blank(16, 24, 40 + 20 + 768 + 64)}});
+        // With one image there, nothing shifts and the second lands at offset 0.
+        QTest::newRow("add to one image") << QByteArray() << QList<QList<int>> {{16, 2}, {32, 16}} << 0
+                                          << Patched<quint32>(Patched<quint32>(added({two, sixteen}), 18, 22), 34, 0);
+        QTest::newRow("add to three") << three << QList<QList<int>> {{64, 256}} << 0
+                                      << BuildIconFile(ThreeImages
+                                             + QList<IconImage> {{64, 64, 0, 1, 8, BlankBitmap(64, 64, 8)}});
+        QTest::newRow("remove middle") << three << QList<QList<int>>() << 2
+                                       << BuildIconFile({ThreeImages.at(0), ThreeImages.at(2)});
     }
 
-    // A blank image: header, black palette (but white for colour 1 of a 1-bit image), zero bits, at offset 22.
-    void addImage()
+    void edits()
     {
-        QFETCH(int, side);
-        QFETCH(int, colours);
-        QFETCH(int, bitCount);
-        QFETCH(int, storedCount);
-        QFETCH(int, size);
+        QFETCH(QByteArray, start);
+        QFETCH(QList<QList<int>>, adds);
+        QFETCH(int, remove);
+        QFETCH(QByteArray, expected);
         cFileIcon icon;
-        icon.AddImage(side, side, colours);
-        QByteArray image = BlankBitmap(side, side, bitCount).left(16).leftJustified(size, '\0');
-        if (bitCount == 1)
-            image.replace(44, 3, "\xff\xff\xff");
-        const QByteArray expected
-            = BuildIconFile({{quint8(side), quint8(side), quint8(storedCount), 1, quint16(bitCount), image}});
-        QCOMPARE(icon.toIconFile(), Patched<quint16>(expected, 2, 0)); // a new object's header says type 0
+        const QString path = start.isEmpty() ? QString() : written(start);
+        QVERIFY(start.isEmpty() || icon.LoadIcon(path));
+        for (const QList<int>& add : adds)
+            icon.AddImage(add.at(0), add.at(0), add.at(1));
+        if (remove)
+            icon.RemoveImage(remove);
+        QCOMPARE(icon.toIconFile(), expected);
+        if (!path.isEmpty()) {
+            QVERIFY(icon.SaveIcon());
+            QCOMPARE(ReadFile(path), expected);
+        }
     }
 
-    void addImageOffsets()
-    {
-        cFileIcon icon;
-        icon.AddImage(16, 16, 2);
-        icon.AddImage(32, 32, 16);
-        QCOMPARE(offsets(icon), QList<quint32>({22, 0})); // a one-image icon is not shifted
-        QVERIFY(icon.LoadIcon(written(BuildIconFile(ThreeImages))));
-        icon.AddImage(64, 64, 256);
-        QCOMPARE(icon.toIconFile(),
-            BuildIconFile(ThreeImages + QList<IconImage> {{64, 64, 0, 1, 8, BlankBitmap(64, 64, 8)}}));
-    }
-
-    void addImageRefuses()
+    void addRefuses()
     {
         cFileIcon icon;
         QVERIFY(icon.LoadIcon(written(BuildIconFile(ThreeImages))));
         const NumberedError error = Raised([&] { icon.AddImage(32, 32, 256); });
-        QCOMPARE(error.number(), 0x80040419u);
-        QCOMPARE(error.message(), QStringLiteral("Icon already exists."));
+        QCOMPARE(QString::number(error.number(), 16) + u' ' + error.message(), u"80040419 Icon already exists."_s);
         QVERIFY_THROWS_EXCEPTION(NumberedError, icon.AddImage(-1, 16, 16));
         QVERIFY_THROWS_EXCEPTION(NumberedError, icon.AddImage(16, 16, 0x7FFFFFFF));
         QCOMPARE(icon.toIconFile(), BuildIconFile(ThreeImages));
     }
 
-    void removeImage_data()
+    void decodes_data()
+    {
+        QTest::addColumn<QByteArray>("image");
+        QTest::addColumn<QString>("expected");
+        const QString oneBit = u"ff000000 ffffffff ff000000 | ffffffff ffffffff 00000000"_s;
+        QTest::newRow("1-bit") << OneBit << oneBit;
+        QTest::newRow("1-bit, top-down") << withField(OneBit, 8, -4)
+                                         << "ffffffff ffffffff 00000000 | ff000000 ffffffff ff000000";
+        QTest::newRow("1-bit, mask one byte short: opaque")
+            << OneBit.chopped(1) << "ff000000 ffffffff ff000000 | ffffffff ffffffff ff000000";
+        QTest::newRow("1-bit, version 4 header")
+            << withField(OneBit.left(40) + QByteArray(68, '\0') + OneBit.mid(40), 0, 108) << oneBit;
+        QTest::newRow("4-bit, three palette colours")
+            << bitmap(3, 2, 4, 3, "0000ff00 00ff0000 ff000000 01200000 21000000 00000000 00000000")
+            << "ff0000ff ff00ff00 ffff0000 | ffff0000 ff00ff00 ff0000ff";
+        QTest::newRow("8-bit, index past the palette is black")
+            << bitmap(3, 2, 8, 2, "0000ff00 00ff0000 00010500 01000000 00000000 00000000")
+            << "ff00ff00 ffff0000 ffff0000 | ffff0000 ff00ff00 ff000000";
+        // 0x4101 holds 16, 8 and 1 of 31.
+        QTest::newRow("16-bit") << bitmap(3, 2, 16, 0, "007ce0031f000000 e07f0141ffff0000 00000000 00000000")
+                                << "ffffff00 ff834108 ffffffff | ffff0000 ff00ff00 ff0000ff";
+        QTest::newRow("16-bit with bit fields")
+            << withField(bitmap(1, 1, 16, 0, "007c0000 e0030000 1f000000 e0030000 00000000"), 16, 3) << "ff00ff00";
+        QTest::newRow("24-bit") << bitmap(2, 2, 24, 0, "0000ff00ff000000 ff00001020300000 00000000 00000000")
+                                << "ff0000ff ff302010 | ffff0000 ff00ff00";
+        QTest::newRow("32-bit with alpha: mask unused")
+            << bitmap(2, 2, 32, 0, "0000ff8000ff0000 ff0000ff00000000 40000000 80000000")
+            << "ff0000ff 00000000 | 80ff0000 0000ff00";
+        QTest::newRow("32-bit, no alpha: mask used")
+            << bitmap(2, 2, 32, 0, "0000ff0000ff0000 ff00000000000000 40000000 80000000")
+            << "00000000 ff000000 | ffff0000 00000000";
+        QTest::newRow("32-bit with bit fields")
+            << withField(bitmap(1, 1, 32, 0, "0000ff00 00ff0000 ff000000 11223344 00000000"), 16, 3) << "44332211";
+
+        const QByteArray base = BlankBitmap(5, 3, 8);
+        const qsizetype colourEnd = 40 + 4 * 256 + 3 * 8;
+        for (qsizetype length : {qsizetype(0), qsizetype(12), qsizetype(39), qsizetype(40 + 1023), colourEnd - 1})
+            QTest::addRow("cut to %lld bytes", qlonglong(length)) << base.left(length) << "";
+        QTest::newRow("header size 12") << withField(base, 0, 12) << "";
+        QTest::newRow("header size past the end") << withField(base, 0, 0x7FFFFFFF) << "";
+        QTest::newRow("width 0") << withField(base, 4, 0) << "";
+        QTest::newRow("negative width") << withField(base, 4, -5) << "";
+        QTest::newRow("width past 1024") << withField(base, 4, 1025) << "";
+        QTest::newRow("height 1 (half is 0)") << withField(base, 8, 1) << "";
+        QTest::newRow("height past 1024") << withField(base, 8, 2 * 1025) << "";
+        QTest::newRow("most negative height") << withField(base, 8, std::numeric_limits<qint32>::min()) << "";
+        QTest::newRow("run-length compressed") << withField(base, 16, 1) << "";
+        QTest::newRow("bit fields on 8 bits") << withField(base, 16, 3) << "";
+        QTest::newRow("palette of 2^32 - 1") << withField(base, 32, -1) << "";
+        QTest::newRow("2-bit") << withField(base, 14, 2) << "";
+        QTest::newRow("PNG signature only") << QByteArray("\x89PNG\r\n\x1a\n", 8) << "";
+        QTest::newRow("broken PNG") << QByteArray("\x89PNG\r\n\x1a\n\0\0\0\rIHDR", 16) << "";
+    }
+
+    // Through an icon whose directory entry says nothing (size, planes and bit count 0): the bitmap's own header
+    // counts.
+    void decodes()
+    {
+        QFETCH(QByteArray, image);
+        QFETCH(QString, expected);
+        const cFileIcon icon = loaded(BuildIconFile({{0, 0, 0, 0, 0, image}}));
+        QCOMPARE(pixels(icon.IconHandle(1)), expected);
+        QCOMPARE(pixels(IconImageDecoder::Decode(image).composed), expected);
+    }
+
+    // icotool made the fixture icon from these pictures: what it put into colour bits, mask and alpha comes back.
+    void fixtureImagesMatchTheirPictures_data()
     {
         QTest::addColumn<int>("index");
-        QTest::addColumn<QList<IconImage>>("kept");
-        QTest::newRow("first") << 1 << ThreeImages.mid(1);
-        QTest::newRow("middle") << 2 << QList<IconImage> {ThreeImages.at(0), ThreeImages.at(2)};
-        QTest::newRow("last") << 3 << ThreeImages.mid(0, 2);
+        QTest::addColumn<QString>("png");
+        QTest::addColumn<bool>("alpha");
+        QTest::newRow("1-bit") << 1 << "mono16.png" << false;
+        QTest::newRow("4-bit") << 2 << "c16_32.png" << false;
+        QTest::newRow("8-bit") << 3 << "c256_48.png" << false;
+        QTest::newRow("32-bit alpha") << 4 << "rgba32.png" << true;
+        QTest::newRow("PNG entry") << 5 << "big256.png" << true;
     }
 
-    // Saved under the name it was loaded from, packed again.
-    void removeImage()
+    void fixtureImagesMatchTheirPictures()
     {
         QFETCH(int, index);
-        QFETCH(QList<IconImage>, kept);
-        const QString path = written(BuildIconFile(ThreeImages));
+        QFETCH(QString, png);
+        QFETCH(bool, alpha);
         cFileIcon icon;
-        QVERIFY(icon.LoadIcon(path));
-        icon.RemoveImage(index);
-        QVERIFY(icon.SaveIcon());
-        QCOMPARE(ReadFile(path), BuildIconFile(kept));
+        QVERIFY(icon.LoadIcon(IconInput(u"main.ico"_s)));
+        QCOMPARE(icon.BestIconPicture().size(), QSize(32, 32)); // not the 48 or 256 wide images
+        const QImage source = QImage(IconInput(png)).convertToFormat(QImage::Format_ARGB32);
+        QVERIFY(!source.isNull());
+        const IconImageDecoder::Bitmaps bitmaps = IconImageDecoder::Decode(icon.imageBytes(index));
+        QCOMPARE(icon.IconPicture(index), bitmaps.composed);
+        QCOMPARE(bitmaps.composed.size(), source.size());
+        for (int y = 0; y < source.height(); ++y) {
+            for (int x = 0; x < source.width(); ++x) {
+                const QRgb want = source.pixel(x, y);
+                const bool shows = qAlpha(want) < 128; // icotool's threshold for the AND mask
+                QCOMPARE(bitmaps.mask.pixel(x, y), shows ? 0xFFFFFFFFu : 0xFF000000u);
+                const QRgb composed = alpha ? want : (shows ? 0u : want | 0xFF000000u);
+                if (qAlpha(composed) == 0)
+                    QCOMPARE(qAlpha(bitmaps.composed.pixel(x, y)), 0);
+                else
+                    QCOMPARE(bitmaps.composed.pixel(x, y), composed);
+                if (!shows)
+                    QCOMPARE(bitmaps.colour.pixel(x, y), want | 0xFF000000u);
+            }
+        }
     }
 
-    void removeImageOutsideOrFromOneImage()
+    void bestImage_data()
     {
-        cFileIcon icon;
-        QVERIFY(icon.LoadIcon(written(BuildIconFile(ThreeImages))));
-        icon.RemoveImage(7); // not found: the count still falls and the last place goes, offsets untouched
-        QCOMPARE(offsets(icon), QList<quint32>({54, 350}));
-        QCOMPARE(icon.imageBytes(2), BlankBitmap(32, 32, 8));
-        cFileIcon one;
-        one.AddImage(32, 32, 16);
-        one.RemoveImage(5);
-        QCOMPARE(one.ImageCount(), 0);
-        QVERIFY_THROWS_EXCEPTION(NumberedError, one.entry(1));
+        QTest::addColumn<QList<QList<int>>>("images"); // width, colour count, bit count
+        QTest::addColumn<int>("depth");
+        QTest::addColumn<int>("best");
+        QTest::newRow("32 wide beats closer depth")
+            << QList<QList<int>> {{16, 0, 8}, {48, 0, 32}, {32, 16, 4}} << 32 << 3;
+        QTest::newRow("exact match returns at once")
+            << QList<QList<int>> {{16, 0, 8}, {48, 0, 32}, {32, 16, 4}, {32, 0, 32}} << 32 << 4;
+        QTest::newRow("closest depth among 32 wide")
+            << QList<QList<int>> {{32, 2, 1}, {32, 0, 8}, {32, 16, 4}} << 24 << 2;
+        QTest::newRow("closest width without 32") << QList<QList<int>> {{16, 0, 8}, {48, 0, 8}, {24, 0, 8}} << 8 << 3;
+        QTest::newRow("no other width after a 32") << QList<QList<int>> {{32, 2, 1}, {31, 0, 32}} << 32 << 1;
+        QTest::newRow("no images") << QList<QList<int>> {} << 32 << 1;
     }
 
-    void cloneCopiesEverything()
+    void bestImage()
     {
-        cFileIcon icon;
-        QVERIFY(icon.LoadIcon(written(BuildIconFile(ThreeImages))));
-        cFileIcon target;
-        target.AddImage(8, 8, 2);
-        icon.CloneTo(target);
-        icon.RemoveImage(1);
-        QCOMPARE(target.Filename(), icon.Filename());
-        QCOMPARE(target.toIconFile(), BuildIconFile(ThreeImages));
+        QFETCH(QList<QList<int>>, images);
+        QFETCH(int, depth);
+        QFETCH(int, best);
+        QList<IconImage> fakes;
+        for (const QList<int>& image : images)
+            fakes.append({quint8(image.at(0)), quint8(image.at(0)), quint8(image.at(1)), 1, quint16(image.at(2)),
+                BlankBitmap(4, 4, 4)});
+        cFileIcon icon = images.isEmpty() ? cFileIcon() : loaded(BuildIconFile(fakes));
+        QCOMPARE(icon.bestIconIndex(depth), best);
+        QCOMPARE(icon.BestIconPicture().isNull(), images.isEmpty());
     }
 };
 

@@ -53,7 +53,6 @@ private Q_SLOTS:
         QTest::newRow("Windows executable through the runner")
             << u"{root}/games/game.exe -windowed"_qs << u"{root}/bin/wine"_qs
             << QStringList {u"{root}/games/game.exe"_qs, u"-windowed"_qs};
-        QTest::newRow("blank") << u"   "_qs << none << QStringList();
         QTest::newRow("missing program") << u"no-such-program-brimvault -x"_qs << none << QStringList();
         QTest::newRow("not executable") << u"{root}/my games/run"_qs << none << QStringList();
         QTest::newRow("folder") << u"{root}/my games"_qs << none << QStringList();
