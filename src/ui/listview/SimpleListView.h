@@ -9,6 +9,8 @@
 #include <QVariantMap>
 #include <QWidget>
 
+#include <functional>
+
 class QMimeData;
 class QScrollBar;
 class QTimer;
@@ -66,6 +68,19 @@ public:
     QScrollBar* vbarWindow() const { return m_vbar; }
     QTimer* Timer1() const { return m_timer; }
 
+    // Narrowing: only the items the test accepts are shown, re-flowed in their order; every operation above
+    // sees the shown items only. Items added or renamed later are tested too. An empty test shows all.
+    using NarrowingTest = std::function<bool(const QString& caption, const QString& data)>;
+    void setNarrowing(NarrowingTest shows);
+    bool isNarrowed() const { return bool(m_narrowing); }
+    bool isItemShown(int index) const;
+    int shownCount() const;
+    // Selects a shown item and scrolls to a value of the scroll bar, as a view saved before narrowing.
+    void restoreView(int index, int scrollValue);
+
+    // The tooltip of an item, asked for when the pointer rests on it; none when it gives an empty text.
+    void setToolTipSource(std::function<QString(int index)> source);
+
 Q_SIGNALS:
     // Arguments passed by reference may be changed by a directly connected host: an Effect of 0 refuses a
     // drop (1 copy, 2 move, 4 link). Button: 1 left, 2 right, 4 middle; Shift: 1 shift, 2 control, 4 alt.
@@ -85,6 +100,7 @@ Q_SIGNALS:
     void propertyChanged(const QString& name);
 
 protected:
+    bool event(QEvent* event) override;
     void paintEvent(QPaintEvent* event) override;
     void resizeEvent(QResizeEvent* event) override;
     void showEvent(QShowEvent* event) override;
@@ -129,6 +145,14 @@ private:
     QRect itemArea() const;
     const std::vector<int>& itemsNear(double shownTop, double shownBottom) const;
 
+    // Narrowing
+    // Moves the selection off an item the narrowing left out: to the next shown item, else the one before.
+    void selectShownNear(int index);
+    // After a rename: the current item leaves when it no longer passes the test.
+    void renarrowCurrent();
+    // The first item the narrowing shows; 0 when it shows none.
+    int firstShown() const;
+
     // Selection and input
     ListError selectItem(int index);
     void onHighlightTimeout();
@@ -150,6 +174,8 @@ private:
     int m_oleDropMode = 0;
     Hit m_capture;
     int m_wheelRemainder = 0;
+    NarrowingTest m_narrowing;
+    std::function<QString(int)> m_toolTipSource;
 };
 
 } // namespace Brimvault
