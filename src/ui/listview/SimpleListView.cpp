@@ -97,6 +97,9 @@ bool SimpleListView::addItem(const QPixmap* picture, const QString& caption, con
     }
     ++m_state.itemCount;
     updateItem(index);
+    // The first game a narrowing shows after it showed none becomes the current one.
+    if (m_narrowing && !item.narrowedOut && !isItemShown(m_frame.currentIndex()))
+        selectItem(index);
     return true;
 }
 

@@ -142,8 +142,8 @@ private Q_SLOTS:
             window->mnuActions()->hide();
         }
         QCOMPARE(menuLayout(window->mnuActions()),
-            u"mnuAddFile mnuAddFolder mnuInstall - mnuGetMoreGames - mnuActionRemoveFile mnuActionRemoveAllFiles - "
-            "mnuLanguage - mnuHelp - mnuAbout"_s);
+            u"mnuAddFile mnuAddFolder mnuInstall - mnuOrder - mnuGetMoreGames - mnuActionRemoveFile "
+            "mnuActionRemoveAllFiles - mnuLanguage - mnuHelp - mnuAbout"_s);
         QCOMPARE(menuLayout(window->mnuItemPopup()), u"mnuOpenGame - mnuRenameGame mnuRemoveFile"_s);
 
         // A right click selects the item and opens the item menu after a short timer; a left click opens nothing.
