@@ -95,14 +95,18 @@ bool Query::matches(const FindKey& key) const
     return m_compact.isEmpty() || key.caption.contains(m_compact) || key.nameWords.contains(m_wordStart);
 }
 
-const FindKey& KeyCache::keyFor(const QString& caption, const QString& path)
+const FindKey& KeyCache::keyAt(int index, const QString& caption, const QString& path)
 {
-    auto it = m_keys.find(path);
-    if (it == m_keys.end())
-        it = m_keys.insert(path, Entry {caption, MakeFindKey(caption, path)});
-    else if (it->caption != caption)
-        *it = Entry {caption, MakeFindKey(caption, path)};
-    return it->key;
+    if (index < 0)
+        index = 0;
+    if (m_keys.size() <= std::size_t(index))
+        m_keys.resize(std::size_t(index) + 1);
+    Entry& entry = m_keys[std::size_t(index)];
+    const bool same = (entry.caption.isSharedWith(caption) || entry.caption == caption)
+        && (entry.path.isSharedWith(path) || entry.path == path);
+    if (!same || (entry.caption.isNull() && entry.path.isNull()))
+        entry = Entry {caption, path, MakeFindKey(caption, path)};
+    return entry.key;
 }
 
 } // namespace Brimvault::GameFinder

@@ -3,6 +3,8 @@
 #include <QHash>
 #include <QString>
 
+#include <vector>
+
 namespace Brimvault {
 
 // Finding games as the user types. Text is folded once per game (letter case and accents dropped, so é is
@@ -32,18 +34,20 @@ private:
     QString m_wordStart;
 };
 
-// Find keys kept by path, made again when the caption changes (a rename).
+// Find keys kept by list position, made again when the text at that position is no longer the same one (a
+// rename, a removal, a new list). A key press then costs two pointer comparisons per game.
 class KeyCache {
 public:
-    const FindKey& keyFor(const QString& caption, const QString& path);
+    const FindKey& keyAt(int index, const QString& caption, const QString& path);
     void clear() { m_keys.clear(); }
 
 private:
     struct Entry {
         QString caption;
+        QString path;
         FindKey key;
     };
-    QHash<QString, Entry> m_keys;
+    std::vector<Entry> m_keys;
 };
 
 } // namespace GameFinder

@@ -69,7 +69,7 @@ bool SimpleListView::addItem(const QPixmap* picture, const QString& caption, con
         return false; // that element is already loaded
     ListItem& item = index > 0 ? m_model.load() : m_model.at(0);
     // A game the narrowing leaves out is loaded without taking a cell.
-    item.narrowedOut = m_narrowing && !m_narrowing(caption, dataString);
+    item.narrowedOut = m_narrowing && !m_narrowing(index, caption, dataString);
     if (index > 0 && !item.narrowedOut)
         GridLayout::placeNext(item, m_state, usableWidth());
 

@@ -70,7 +70,7 @@ public:
 
     // Narrowing: only the items the test accepts are shown, re-flowed in their order; every operation above
     // sees the shown items only. Items added or renamed later are tested too. An empty test shows all.
-    using NarrowingTest = std::function<bool(const QString& caption, const QString& data)>;
+    using NarrowingTest = std::function<bool(int index, const QString& caption, const QString& data)>;
     void setNarrowing(NarrowingTest shows);
     bool isNarrowed() const { return bool(m_narrowing); }
     bool isItemShown(int index) const;

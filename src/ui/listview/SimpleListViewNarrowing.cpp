@@ -27,7 +27,7 @@ void SimpleListView::setNarrowing(NarrowingTest shows)
     for (int i = 0; i < m_model.loadedCount(); ++i) {
         ListItem& item = m_model.at(i);
         const bool empty = i >= m_state.itemCount;
-        item.narrowedOut = m_narrowing && !empty && !m_narrowing(item.caption, item.tag);
+        item.narrowedOut = m_narrowing && !empty && !m_narrowing(i, item.caption, item.tag);
         if (firstShown < 0 && !item.narrowedOut && !empty)
             firstShown = i;
     }
@@ -95,7 +95,7 @@ void SimpleListView::renarrowCurrent()
     if (!m_narrowing || !isItemShown(current))
         return;
     ListItem& item = m_model.at(current);
-    if (m_narrowing(item.caption, item.tag))
+    if (m_narrowing(current, item.caption, item.tag))
         return;
     item.narrowedOut = true;
     selectShownNear(current);

@@ -108,8 +108,8 @@ void ListFinder::narrow(const QString& text)
         return;
     }
     const GameFinder::Query query(text);
-    m_list->setNarrowing([this, query](const QString& caption, const QString& data) {
-        return query.matches(m_keys.keyFor(caption, data));
+    m_list->setNarrowing([this, query](int index, const QString& caption, const QString& data) {
+        return query.matches(m_keys.keyAt(index, caption, data));
     });
 }
 
