@@ -14,12 +14,15 @@
 #include "ui/main/frmMain.h"
 
 #include <QAction>
+#include <QJsonArray>
+#include <QJsonDocument>
 #include <QLineEdit>
 #include <QMimeData>
 #include <QProcess>
 #include <QScrollBar>
 #include <QSignalSpy>
 #include <QTest>
+#include <QTimeZone>
 #include <QUrl>
 
 using namespace Brimvault;
@@ -179,6 +182,22 @@ private Q_SLOTS:
             printed.append(line.section(u'\t', 0, 0));
         QCOMPARE(printed.size(), 11);
         QCOMPARE(printed, shownCaptions());
+
+        // The history of a game played for a minute, as scripts read it.
+        const QString played = list()->GetCurrentData();
+        PlayHistory::RecordLaunch(played, QDateTime(QDate(2026, 11, 23), QTime(22, 0), QTimeZone::utc()));
+        PlayHistory::AddPlayTime(played, 61);
+        listing.start(
+            QStringLiteral(BRIMVAULT_BIN_DIR "/brimvault"), {u"--list"_s, u"--json"_s, u"--find"_s, u"zle1"_s});
+        QVERIFY(listing.waitForFinished(60000));
+        const QJsonArray games = QJsonDocument::fromJson(listing.readAllStandardOutput()).array();
+        QCOMPARE(games.size(), 11);
+        for (const QJsonValue& game : games) {
+            const bool isPlayed = game[u"path"_s].toString() == played;
+            QCOMPARE(game[u"launches"_s].toInt(), isPlayed ? 1 : 0);
+            QCOMPARE(game[u"playSeconds"_s].toInt(), isPlayed ? 61 : 0);
+            QCOMPARE(game[u"lastPlayed"_s].toString(), isPlayed ? u"2026-11-23T22:00:00Z"_s : QString());
+        }
     }
 };
 
