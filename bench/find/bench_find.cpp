@@ -45,7 +45,10 @@ QList<GameEntry> makeEntries(int count)
         const QString first = QString::fromUtf8(words[random.bounded(int(std::size(words)))]);
         const QString second = QString::fromUtf8(words[random.bounded(int(std::size(words)))]);
         const QString caption = first + u' ' + second + u' ' + QString::number(i);
-        entries.append(GameEntry {caption, QStringLiteral("C:\\Games\\%1\\%2%3.exe").arg(caption, second).arg(i)});
+        GameEntry entry;
+        entry.caption = caption;
+        entry.path = QStringLiteral("C:\\Games\\%1\\%2%3.exe").arg(caption, second).arg(i);
+        entries.append(entry);
     }
     return entries;
 }

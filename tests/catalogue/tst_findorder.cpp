@@ -21,8 +21,12 @@ class TestFindOrder : public QObject {
     static QList<GameEntry> entries(const QStringList& captions)
     {
         QList<GameEntry> list;
-        for (const QString& caption : captions)
-            list.append(GameEntry {caption, u"C:\\Games\\"_s + caption + u".exe"_s});
+        for (const QString& caption : captions) {
+            GameEntry entry;
+            entry.caption = caption;
+            entry.path = u"C:\\Games\\"_s + caption + u".exe"_s;
+            list.append(entry);
+        }
         return list;
     }
     static QStringList captions(const QList<GameEntry>& list)
