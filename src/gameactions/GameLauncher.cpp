@@ -5,10 +5,13 @@
 #include "gameactions/CaseInsensitivePath.h"
 #include "gameactions/CompatibilityRunner.h"
 #include "gameactions/LaunchRules.h"
+#include "gameactions/PlayTimeWatcher.h"
 #include "gameactions/ServiceCommands.h"
+#include "store/PlayHistory.h"
 #include "support/CommandLine.h"
 #include "support/PathFunctions.h"
 
+#include <QDateTime>
 #include <QDesktopServices>
 #include <QDir>
 #include <QFileInfo>
@@ -33,6 +36,7 @@ GameLauncher::GameLauncher(QObject* parent)
     : QObject(parent)
     , m_connectionProbe(&IsConnected)
     , m_catalogueRoot(&CatalogueServerRoot)
+    , m_playTime(new PlayTimeWatcher(this))
 { }
 
 GameLauncher::~GameLauncher() = default;
@@ -64,28 +68,34 @@ void GameLauncher::LaunchGame(const QString& path, bool offline, const QString& 
     enterGameFolder(onDisk);
     switch (LaunchKindOf(onDisk)) {
     case LaunchKind::WebPage:
-        openInBrowser(onDisk);
+        if (openInBrowser(onDisk))
+            PlayHistory::RecordLaunch(path, QDateTime::currentDateTimeUtc());
         break;
     case LaunchKind::Process:
-        startProcess(onDisk, runner);
+        if (const std::optional<qint64> pid = startProcess(onDisk, runner)) {
+            PlayHistory::RecordLaunch(path, QDateTime::currentDateTimeUtc());
+            m_playTime->watch(*pid, path);
+        }
         break;
     case LaunchKind::FlashMovie:
+        // The window that plays the movie adds its play time when it closes.
+        PlayHistory::RecordLaunch(path, QDateTime::currentDateTimeUtc());
         playMovie(onDisk, offline, caption);
         break;
     }
     signalServiceOnce(runner);
 }
 
-void GameLauncher::openInBrowser(const QString& pathOrAddress)
+bool GameLauncher::openInBrowser(const QString& pathOrAddress)
 {
-    QDesktopServices::openUrl(BrowserUrl(pathOrAddress));
+    return QDesktopServices::openUrl(BrowserUrl(pathOrAddress));
 }
 
-void GameLauncher::startProcess(const QString& path, const QString& runner)
+std::optional<qint64> GameLauncher::startProcess(const QString& path, const QString& runner)
 {
     // The path is the whole command line, unquoted: a path with blanks is found by its shortest start that
     // names a program.
-    StartCommandLine(path, 1, runner);
+    return StartCommandLine(path, 1, runner);
 }
 
 void GameLauncher::playMovie(const QString& path, bool offline, const QString& caption)

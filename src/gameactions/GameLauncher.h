@@ -3,8 +3,11 @@
 #include <QObject>
 #include <QString>
 #include <functional>
+#include <optional>
 
 namespace Brimvault {
+
+class PlayTimeWatcher;
 
 // Starts the game behind a list item, never waiting for it and never reporting a failure: a web page opens in
 // the default browser, a Flash movie asks for a media host window (or opens its article page on the catalogue
@@ -28,6 +31,8 @@ public:
     void LaunchGame(const QString& path, bool offline, const QString& caption);
 
     bool serviceSignalled() const { return m_serviceSignalled; }
+    // Counts the launches and the play time of started processes (store/PlayHistory.h).
+    PlayTimeWatcher* playTime() const { return m_playTime; }
 
     // Whether the catalogue server answers, and its root address; asked only for numbered movies. The
     // connection check and the configured catalogue server unless replaced.
@@ -39,13 +44,14 @@ Q_SIGNALS:
     void flashMovieRequested(const QString& path, const QString& caption);
 
 private:
-    void openInBrowser(const QString& pathOrAddress);
-    void startProcess(const QString& path, const QString& runner);
+    bool openInBrowser(const QString& pathOrAddress);
+    std::optional<qint64> startProcess(const QString& path, const QString& runner);
     void playMovie(const QString& path, bool offline, const QString& caption);
     void signalServiceOnce(const QString& runner);
 
     ConnectionProbe m_connectionProbe;
     CatalogueRootSource m_catalogueRoot;
+    PlayTimeWatcher* m_playTime = nullptr;
     bool m_serviceSignalled = false;
 };
 

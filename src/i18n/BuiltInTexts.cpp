@@ -49,6 +49,16 @@ constexpr std::array kBuiltInTexts {
     NumberedText {1250, u"Online games"},
     NumberedText {1260, u"There was an error! The game isn't removed!"},
     NumberedText {1270, u"Open game offline"},
+    // Finding, ordering and the play history
+    NumberedText {1300, u"Find a game"},
+    NumberedText {1310, u"Order"},
+    NumberedText {1320, u"As found"},
+    NumberedText {1330, u"By name"},
+    NumberedText {1340, u"Recently played"},
+    NumberedText {1350, u"Never played"},
+    NumberedText {1360, u"Last played %date%, played for %time% (%count% times)"},
+    NumberedText {1370, u"%h% h %m% min"},
+    NumberedText {1380, u"%m% min"},
     // Internet games that come with Windows
     NumberedText {2010, u"Internet Nardi"},
     NumberedText {2020, u"Internet Shashki"},

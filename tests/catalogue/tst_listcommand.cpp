@@ -99,7 +99,7 @@ private Q_SLOTS:
         QStringList jsonLines;
         for (const QJsonValue& value : array) {
             const QJsonObject object = value.toObject();
-            QCOMPARE(object.size(), 3);
+            QCOMPARE(object.size(), 6);
             iconByPath.insert(object.value(u"path"_s).toString(), object.value(u"icon"_s).toString());
             jsonLines.append(object.value(u"caption"_s).toString() + u'\t' + object.value(u"path"_s).toString());
         }

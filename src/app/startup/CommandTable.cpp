@@ -39,13 +39,34 @@ int versionInfo(const QStringList& arguments)
 
 int listCatalogue(const QStringList& arguments)
 {
-    if (!arguments.isEmpty() && arguments.first() != QLatin1String("--json")) {
-        QTextStream(stderr) << "Unknown argument for --list: " << arguments.first() << '\n' << Usage();
+    CatalogueListing::ListingOptions options;
+    const auto refuse = [](const QString& problem) {
+        QTextStream(stderr) << problem << '\n' << Usage();
         return UsageExitCode;
+    };
+    QStringList seen;
+    for (qsizetype i = 0; i < arguments.size(); ++i) {
+        const QString& argument = arguments.at(i);
+        if (seen.contains(argument))
+            return refuse(QStringLiteral("Given twice: ") + argument);
+        seen.append(argument);
+        if (argument == QLatin1String("--json")) {
+            options.format = CatalogueListing::Format::Json;
+        } else if (argument == QLatin1String("--find") || argument == QLatin1String("--order")) {
+            if (i + 1 >= arguments.size())
+                return refuse(QStringLiteral("Missing value for ") + argument);
+            const QString value = arguments.at(++i);
+            if (argument == QLatin1String("--find")) {
+                options.find = value;
+            } else if (!(options.order = ListOrders::FromName(value))) {
+                return refuse(QStringLiteral("Unknown order: ") + value);
+            }
+        } else {
+            return refuse(QStringLiteral("Unknown argument for --list: ") + argument);
+        }
     }
     QTextStream out(stdout);
-    return CatalogueListing::PrintCatalogue(
-        arguments.isEmpty() ? CatalogueListing::Format::Text : CatalogueListing::Format::Json, out);
+    return CatalogueListing::PrintCatalogue(options, out);
 }
 
 } // namespace
@@ -59,8 +80,8 @@ QList<Command> Commands()
             QStringLiteral("write the main icon of an executable as an icon file"), 2, 2, extractIcon},
         {QStringLiteral("--version-info"), QStringLiteral("FILE"),
             QStringLiteral("print the version information of an executable"), 1, 1, versionInfo},
-        {QStringLiteral("--list"), QStringLiteral("[--json]"),
-            QStringLiteral("print the games as the window lists them, without writing anything"), 0, 1, listCatalogue},
+        {QStringLiteral("--list"), QStringLiteral("[--json] [--find TEXT] [--order found|name|recent]"),
+            QStringLiteral("print the games as the window lists them, without writing anything"), 0, 5, listCatalogue},
     };
 }
 

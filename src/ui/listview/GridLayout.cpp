@@ -58,6 +58,8 @@ void arrangeAll(ListModel& model, ListLayoutState& state, SelectionFrame& frame,
 
     for (int i = 0; i < model.loadedCount(); ++i) {
         ListItem& item = model.at(i);
+        if (item.narrowedOut)
+            continue;
         ++column;
         if (state.nextCellX + ListGrid::CellWidth > usableWidth) {
             state.nextCellX = 0;
@@ -106,6 +108,8 @@ Extent contentExtent(const ListModel& model, const SelectionFrame& frame, const 
     include(frame.rect.left() + state.horizontalOffset, frame.rect.top(), frame.rect.width(), frame.rect.height());
     for (int i = 0; i < model.loadedCount(); ++i) {
         const ListItem& item = model.at(i);
+        if (item.narrowedOut)
+            continue;
         include(item.iconLeft + state.horizontalOffset, item.iconTop, ListGrid::IconSize, ListGrid::IconSize);
         include(item.captionLeft + state.horizontalOffset, item.captionTop, ListGrid::CaptionWidth, item.captionHeight);
     }

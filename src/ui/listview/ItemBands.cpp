@@ -40,8 +40,10 @@ void ItemBands::rebuild(const ListModel& model)
 {
     for (std::vector<int>& band : m_bands)
         band.clear();
-    for (int i = 0; i < model.loadedCount(); ++i)
-        insert(i, model.at(i));
+    for (int i = 0; i < model.loadedCount(); ++i) {
+        if (!model.at(i).narrowedOut)
+            insert(i, model.at(i));
+    }
     m_valid = true;
 }
 

@@ -40,6 +40,8 @@ std::optional<int> findNeighbour(const ListModel& model, double scrollOffsetY, i
         if (i == currentIndex)
             continue;
         const ListItem& item = model.at(i);
+        if (item.narrowedOut)
+            continue;
         const double left = item.iconLeft;
         const double top = item.iconTop + scrollOffsetY;
         bool candidate = false;

@@ -55,7 +55,7 @@ QRectF ListIcon::geometry() const
 
 bool ListIcon::isVisible() const
 {
-    return isLoaded() && m_list->m_model.at(m_index).iconVisible;
+    return isLoaded() && m_list->m_model.at(m_index).iconVisible && !m_list->m_model.at(m_index).narrowedOut;
 }
 
 ListCaption::ListCaption(SimpleListView* list, int index)
@@ -90,7 +90,7 @@ QRectF ListCaption::geometry() const
 
 bool ListCaption::isVisible() const
 {
-    return isLoaded() && m_list->m_model.at(m_index).captionVisible;
+    return isLoaded() && m_list->m_model.at(m_index).captionVisible && !m_list->m_model.at(m_index).narrowedOut;
 }
 
 } // namespace Brimvault

@@ -52,6 +52,7 @@ void ListModel::copyContent(int from, int to)
     target.caption = source.caption;
     target.captionHeight = source.captionHeight;
     target.tag = source.tag;
+    target.narrowedOut = source.narrowedOut;
 }
 
 } // namespace Brimvault

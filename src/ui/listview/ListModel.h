@@ -26,6 +26,9 @@ struct ListItem {
     int captionHeight = 0;
     QRgb captionColor = qRgb(255, 255, 255);
     bool captionVisible = false;
+
+    // Left out by the host's narrowing: takes no cell, is neither painted nor reachable.
+    bool narrowedOut = false;
 };
 
 // The selection frame; its tag text holds the current index.

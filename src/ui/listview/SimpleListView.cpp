@@ -69,7 +69,9 @@ bool SimpleListView::addItem(const QPixmap* picture, const QString& caption, con
     if (index > 0 && index != m_model.loadedCount())
         return false; // that element is already loaded
     ListItem& item = index > 0 ? m_model.load() : m_model.at(0);
-    if (index > 0)
+    // A game the narrowing leaves out is loaded without taking a cell.
+    item.narrowedOut = m_narrowing && !m_narrowing(index, caption, dataString);
+    if (index > 0 && !item.narrowedOut)
         GridLayout::placeNext(item, m_state, usableWidth());
 
     item.face.setBackColor(m_backColor.rgb());
@@ -84,7 +86,11 @@ bool SimpleListView::addItem(const QPixmap* picture, const QString& caption, con
     item.tag = dataString;
     item.captionVisible = true;
 
-    if (index > 0) {
+    if (item.narrowedOut) {
+        if (index == 0)
+            m_state.nextCellX = 0; // the first game shown takes the first cell
+        m_bands.invalidate();
+    } else if (index > 0) {
         GridLayout::finishAdd(item, m_state);
         m_bands.append(index, item);
     } else {
@@ -92,6 +98,9 @@ bool SimpleListView::addItem(const QPixmap* picture, const QString& caption, con
     }
     ++m_state.itemCount;
     updateItem(index);
+    // The first game a narrowing shows after it showed none becomes the current one.
+    if (m_narrowing && !item.narrowedOut && !isItemShown(m_frame.currentIndex()))
+        selectItem(index);
     return true;
 }
 
@@ -119,6 +128,7 @@ ListError SimpleListView::RemoveCurrentItem()
     }
     if (m_state.itemCount > 0)
         --m_state.itemCount;
+    selectShownNear(m_frame.currentIndex());
     arrangeItems();
     update();
     return {};
@@ -142,36 +152,38 @@ void SimpleListView::clearItems()
     first.iconVisible = false;
     first.captionVisible = false;
     first.tag.clear();
+    first.narrowedOut = false;
     m_model.unloadAllButFirst();
     m_bands.invalidate();
 }
 
 void SimpleListView::InitSelection()
 {
-    selectItem(0);
+    selectItem(firstShown());
 }
 
 QString SimpleListView::GetCurrentData() const
 {
     const int current = m_frame.currentIndex();
-    return m_model.isLoaded(current) ? m_model.at(current).tag : QString();
+    return isItemShown(current) ? m_model.at(current).tag : QString();
 }
 
 QString SimpleListView::GetCurrentCaption() const
 {
     const int current = m_frame.currentIndex();
-    return m_model.isLoaded(current) ? m_model.at(current).caption : QString();
+    return isItemShown(current) ? m_model.at(current).caption : QString();
 }
 
 void SimpleListView::SetCurrentCaption(const QString& Caption)
 {
     const int current = m_frame.currentIndex();
-    if (!m_model.isLoaded(current))
+    if (!isItemShown(current))
         return;
     updateItem(current);
     setCaptionText(m_model.at(current), Caption);
     m_bands.invalidate();
     updateItem(current);
+    renarrowCurrent();
 }
 
 QColor SimpleListView::BackColor() const

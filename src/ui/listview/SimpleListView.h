@@ -9,6 +9,8 @@
 #include <QVariantMap>
 #include <QWidget>
 
+#include <functional>
+
 class QMimeData;
 class QPainter;
 class QScrollBar;
@@ -69,7 +71,6 @@ public:
 
     // Assistive technology and the keyboard. An item is shown unless a filter hides it; a filter calls
     // shownItemsChanged() after changing what is shown, so that readers list the items again.
-    bool isItemShown(int index) const;
     void shownItemsChanged();
     quint64 shownRevision() const { return m_shownRevision; }
     // The selected item, or -1 when none is selected or it is not shown.
@@ -80,6 +81,18 @@ public:
     void focusItem(int index);
     // The dashed focus mark around the current item, shown while the list has the focus after keyboard use.
     bool showsFocusMark() const;
+    // Narrowing: only the items the test accepts are shown, re-flowed in their order; every operation above
+    // sees the shown items only. Items added or renamed later are tested too. An empty test shows all.
+    using NarrowingTest = std::function<bool(int index, const QString& caption, const QString& data)>;
+    void setNarrowing(NarrowingTest shows);
+    bool isNarrowed() const { return bool(m_narrowing); }
+    bool isItemShown(int index) const;
+    int shownCount() const;
+    // Selects a shown item and scrolls to a value of the scroll bar, as a view saved before narrowing.
+    void restoreView(int index, int scrollValue);
+
+    // The tooltip of an item, asked for when the pointer rests on it; none when it gives an empty text.
+    void setToolTipSource(std::function<QString(int index)> source);
 
 Q_SIGNALS:
     // Arguments passed by reference may be changed by a directly connected host: an Effect of 0 refuses a
@@ -152,6 +165,13 @@ private:
     void notifyAccessibleFocus();
     void setKeyboardCues(bool shown);
     void paintFocusMark(QPainter& painter) const;
+    // Narrowing
+    // Moves the selection off an item the narrowing left out: to the next shown item, else the one before.
+    void selectShownNear(int index);
+    // After a rename: the current item leaves when it no longer passes the test.
+    void renarrowCurrent();
+    // The first item the narrowing shows; 0 when it shows none.
+    int firstShown() const;
 
     // Selection and input
     ListError selectItem(int index);
@@ -176,6 +196,8 @@ private:
     int m_wheelRemainder = 0;
     bool m_keyboardCues = false;
     quint64 m_shownRevision = 0;
+    NarrowingTest m_narrowing;
+    std::function<QString(int)> m_toolTipSource;
 };
 
 } // namespace Brimvault

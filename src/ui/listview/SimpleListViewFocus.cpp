@@ -18,11 +18,6 @@ void SimpleListView::installAccessibility()
     Q_UNUSED(installed);
 }
 
-bool SimpleListView::isItemShown(int index) const
-{
-    return m_model.isLoaded(index) && index < m_state.itemCount;
-}
-
 void SimpleListView::shownItemsChanged()
 {
     ++m_shownRevision;

@@ -142,11 +142,11 @@ SimpleListView::Hit SimpleListView::hitTest(const QPointF& point) const
     const int current = m_frame.currentIndex();
     auto iconAt = [&](int i) {
         const ListItem& item = m_model.at(i);
-        return item.iconVisible && shownIconRect(item).contains(point);
+        return item.iconVisible && !item.narrowedOut && shownIconRect(item).contains(point);
     };
     auto captionAt = [&](int i) {
         const ListItem& item = m_model.at(i);
-        return item.captionVisible && shownCaptionRect(item).contains(point);
+        return item.captionVisible && !item.narrowedOut && shownCaptionRect(item).contains(point);
     };
     const std::vector<int>& nearby = itemsNear(point.y(), point.y());
     if (m_model.isLoaded(current) && iconAt(current))

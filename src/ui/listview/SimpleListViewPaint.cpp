@@ -13,7 +13,9 @@ void SimpleListView::paintEvent(QPaintEvent* event)
     painter.fillRect(dirty, m_backColor);
     painter.setFont(m_wrapper.font());
 
-    const int current = m_frame.currentIndex();
+    const int current = m_model.isLoaded(m_frame.currentIndex()) && !m_model.at(m_frame.currentIndex()).narrowedOut
+        ? m_frame.currentIndex()
+        : -1;
     const QRectF area(dirty);
     auto drawCaption = [&](const ListItem& item) {
         const QRectF box = shownCaptionRect(item);
@@ -40,7 +42,7 @@ void SimpleListView::paintEvent(QPaintEvent* event)
         if (i != current && m_model.isLoaded(i))
             drawCaption(m_model.at(i));
     }
-    if (m_frame.visible) {
+    if (m_frame.visible && current >= 0) {
         const QRectF frame = selectionFrameRect();
         painter.setPen(QColor::fromRgb(ListGrid::FrameBorderColor));
         painter.setBrush(QColor::fromRgb(ListGrid::FrameFillColor));

@@ -13,6 +13,7 @@
 #include "ui/listview/SimpleListView.h"
 #include "ui/main/ClickLabel.h"
 #include "ui/main/FormScaling.h"
+#include "ui/main/ListFinder.h"
 #include "ui/main/MainWindowDesign.h"
 #include "ui/main/QuilletCalls.h"
 #include "ui/main/StockPictures.h"
@@ -138,6 +139,9 @@ void frmMain::createControls()
     m_tmrIcons->setInterval(MainWindowDesign::IconTimerIntervalMs);
     m_tmrIcons->setSingleShot(true);
     connect(m_tmrIcons, &QTimer::timeout, this, &frmMain::tmrIconsTimer);
+
+    m_finder = new ListFinder(this, m_listView);
+    m_listView->setToolTipSource([this](int index) { return itemToolTip(index); });
 }
 
 void frmMain::placeControls()
@@ -166,6 +170,8 @@ void frmMain::ChangeLocalizeCaptions()
     m_label4->setText(Translate(690));
     setWindowTitle(productName);
     captionMenus();
+    if (m_finder)
+        m_finder->caption();
     keepActionsButtonAtRightEdge();
 }
 

@@ -25,6 +25,7 @@ class ImageCtrl;
 class InstallFolderMemory;
 class ItemMenuDelay;
 class ListBuilder;
+class ListFinder;
 class ServiceSignalWatcher;
 class SimpleListView;
 struct GameEntry;
@@ -56,6 +57,8 @@ public:
     void mnuAboutClick();
     void mnuOpenGameClick();
     void mnuRenameGameClick();
+    // "Order" in the Actions menu: kept in the settings store, then the list is built again in that order.
+    void chooseOrder(int order);
     // Shows mnuActions at the pointer, as a click on the Actions button does.
     void ShowActionsMenu();
     // The keyboard's ways to the menus: mnuActions under the Actions button, mnuItemPopup at the current icon,
@@ -78,6 +81,7 @@ public:
     // An item of either menu by its name ("mnuAddFile"), or null.
     QAction* menuItem(const QString& name) const;
     QTimer* tmrIcons() const { return m_tmrIcons; }
+    ListFinder* finder() const { return m_finder; }
 
     bool isClosing() const { return m_closing; }
     // The list items still waiting for their icons.
@@ -107,6 +111,9 @@ private:
     QAction* addMenuItem(QMenu* menu, const char* name, void (frmMain::*command)());
     void connectGameActions();
     void captionMenus();
+    void createOrderMenu();
+    void checkStoredOrder();
+    QString itemToolTip(int index) const;
     void connectMediaHost();
     void createKeyboardMenus();
 
@@ -160,6 +167,8 @@ private:
     std::unique_ptr<IconCacheBuilder> m_iconBuilder;
     std::unique_ptr<InstallFolderMemory> m_installFolder;
     GameLauncher* m_launcher = nullptr;
+    ListFinder* m_finder = nullptr;
+    QMenu* m_mnuOrder = nullptr;
 
     QString m_lastAddFileFolder;
     int m_actionsRightMargin = 0;

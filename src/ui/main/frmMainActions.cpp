@@ -11,6 +11,9 @@
 #include "gameactions/ItemMenuDelay.h"
 #include "gameactions/PackageInstallCommand.h"
 #include "gameactions/ServiceSignal.h"
+#include "store/CatalogueKeys.h"
+#include "store/PlayHistory.h"
+#include "store/SettingsStore.h"
 #include "ui/listview/SimpleListView.h"
 #include "ui/main/QuilletCalls.h"
 
@@ -58,6 +61,8 @@ QString frmMain::currentCaption() const
 
 void frmMain::listEnterKey(QString& itemData)
 {
+    if (itemData.isEmpty() && m_listView->isNarrowed())
+        return; // nothing found, nothing to start
     m_launcher->launchItem(itemData, currentCaption());
 }
 
@@ -96,12 +101,18 @@ void frmMain::mnuRemoveFileClick()
     if (m_listView->RemoveCurrentItem())
         m_listView->RemoveAll();
     m_builder->ForgetGame(itemData);
+    PlayHistory::Forget(itemData);
 }
 
 void frmMain::mnuRemoveAllFilesClick()
 {
+    const QList<QPair<QString, QString>> added = GetAllSettings(AppTitle(), CatalogueKeys::FilesSection);
     if (!AskAndRemoveAllAddedGames())
         return;
+    for (const auto& [key, path] : added) {
+        if (key.trimmed().compare(CatalogueKeys::CountKey, Qt::CaseInsensitive) != 0)
+            PlayHistory::Forget(path);
+    }
     m_listView->RemoveAll();
     RebuildList();
 }

@@ -7,7 +7,9 @@
 #include "catalogue/GameEntry.h"
 #include "catalogue/IconCacheBuilder.h"
 #include "catalogue/ListBuilder.h"
+#include "catalogue/ListOrder.h"
 #include "icons/NumberedError.h"
+#include "store/PlayHistory.h"
 #include "support/PathFunctions.h"
 #include "support/SystemFolders.h"
 #include "ui/listview/ImageCtrl.h"
@@ -43,16 +45,31 @@ void frmMain::RebuildList()
         m_iconBuilder->clear();
 
         GameDiscovery discovery(*m_builder, CatalogueLocations::fromSystem());
+        // Any order but the found one needs every game before the first is shown.
+        const ListOrder order = ListOrders::Stored();
+        QList<GameEntry> held;
         DiscoveryHooks hooks;
         hooks.stopRequested = [this] { return m_closing; };
-        hooks.clearList = [this] { m_listView->RemoveAll(); };
-        hooks.addItem = [this](const GameEntry& entry) {
-            addEntry(entry);
+        hooks.clearList = [this, &held] {
+            m_listView->RemoveAll();
+            held.clear();
+        };
+        hooks.addItem = [this, order, &held](const GameEntry& entry) {
+            if (order == ListOrder::AsFound)
+                addEntry(entry);
+            else
+                held.append(entry);
             QCoreApplication::processEvents();
         };
         const DiscoveryResult result = discovery.Run(hooks);
         if (result.stopped || m_closing)
             break;
+        if (order != ListOrder::AsFound && !m_rebuildAgain) {
+            ListOrders::Sort(held, order, PlayHistory::ReadAll());
+            for (const GameEntry& entry : std::as_const(held))
+                addEntry(entry);
+            m_listView->Refresh();
+        }
         if (!m_rebuildAgain) {
             m_listView->InitSelection();
             startIconTimerIfNeeded();

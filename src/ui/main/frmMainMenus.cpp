@@ -34,6 +34,9 @@ constexpr MenuCaption menuCaptions[] = {
     {"mnuOpenGame", 1270},
     {"mnuRenameGame", 1150},
     {"mnuRemoveFile", 1160},
+    {"mnuOrderFound", 1320},
+    {"mnuOrderName", 1330},
+    {"mnuOrderRecent", 1340},
 };
 
 // Menu captions are plain text: an "&" in a translation is shown, not taken as a shortcut mark.
@@ -61,6 +64,8 @@ void frmMain::createMenus()
     addMenuItem(m_mnuActions, "mnuAddFolder", &frmMain::mnuAddFolderClick);
     addMenuItem(m_mnuActions, "mnuInstall", &frmMain::mnuInstallClick);
     m_mnuActions->addSeparator();
+    createOrderMenu();
+    m_mnuActions->addSeparator();
     addMenuItem(m_mnuActions, "mnuGetMoreGames", &frmMain::mnuGetMoreGamesClick);
     m_mnuActions->addSeparator();
     addMenuItem(m_mnuActions, "mnuActionRemoveFile", &frmMain::mnuRemoveFileClick);
@@ -82,7 +87,7 @@ void frmMain::createMenus()
 
 QAction* frmMain::menuItem(const QString& name) const
 {
-    for (QMenu* menu : {m_mnuActions.data(), m_mnuItemPopup.data()}) {
+    for (QMenu* menu : {m_mnuActions.data(), m_mnuItemPopup.data(), m_mnuOrder}) {
         if (auto* action = menu ? menu->findChild<QAction*>(name, Qt::FindDirectChildrenOnly) : nullptr)
             return action;
     }
@@ -92,6 +97,8 @@ QAction* frmMain::menuItem(const QString& name) const
 void frmMain::captionMenus()
 {
     m_mnuActions->setTitle(menuText(modLocalizer::Translate(1060)));
+    m_mnuOrder->menuAction()->setText(menuText(modLocalizer::Translate(1310)));
+    m_mnuOrder->setTitle(m_mnuOrder->menuAction()->text());
     for (const MenuCaption& caption : menuCaptions) {
         if (QAction* action = menuItem(QString::fromLatin1(caption.name)))
             action->setText(menuText(modLocalizer::Translate(caption.number)));
