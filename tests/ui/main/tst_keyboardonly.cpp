@@ -86,8 +86,9 @@ private Q_SLOTS:
 
     void keysOpenAMenuWhoseCommandsTheArrowsReach_data()
     {
-        const QStringList actions {u"mnuAddFile"_s, u"mnuAddFolder"_s, u"mnuInstall"_s, u"mnuOrder"_s, u"mnuGetMoreGames"_s,
-            u"mnuActionRemoveFile"_s, u"mnuActionRemoveAllFiles"_s, u"mnuLanguage"_s, u"mnuHelp"_s, u"mnuAbout"_s};
+        const QStringList actions {u"mnuAddFile"_s, u"mnuAddFolder"_s, u"mnuInstall"_s, u"mnuOrder"_s,
+            u"mnuGetMoreGames"_s, u"mnuActionRemoveFile"_s, u"mnuActionRemoveAllFiles"_s, u"mnuLanguage"_s,
+            u"mnuHelp"_s, u"mnuAbout"_s};
         const QStringList item {u"mnuOpenGame"_s, u"mnuRenameGame"_s, u"mnuRemoveFile"_s};
         QTest::addColumn<QString>("keys");
         QTest::addColumn<QStringList>("commands");
