@@ -1,6 +1,6 @@
-// Holds an install slot the way an installing service does, until killed or its standard input closes:
-// the tests use it to leave behind what an interrupted install leaves. With a second argument it keeps
-// holding the games folder lock as well, as an install killed during its final rename would.
+// Holds an install slot as an installing service does, until killed or its standard input closes: what an
+// interrupted install leaves behind. With a second argument it keeps the games folder lock as well, as an
+// install killed during its final rename would.
 #include "StagingArea.h"
 
 #include <QDir>
@@ -10,21 +10,14 @@
 
 int main(int argc, char* argv[])
 {
-    if (argc != 2 && argc != 3)
-        return 2;
     const QString gamesFolder = QString::fromLocal8Bit(argv[1]);
-    std::unique_ptr<Brimvault::InstallSlot> slot;
     auto lock = std::make_unique<Brimvault::GamesFolderLock>(gamesFolder);
-    if (!lock->isLocked())
-        return 1;
-    slot = Brimvault::InstallSlot::create(gamesFolder);
+    const auto slot = lock->isLocked() ? Brimvault::InstallSlot::create(gamesFolder) : nullptr;
     if (argc == 2)
         lock.reset();
-    if (!slot)
-        return 1;
-    QDir(slot->path()).mkpath(QStringLiteral("Half/data"));
-    QFile part(slot->path() + QStringLiteral("/Half/data/part.bin"));
-    if (!part.open(QIODevice::WriteOnly) || part.write(QByteArray(4096, 'x')) != 4096)
+    QFile part(slot ? slot->path() + QStringLiteral("/Half/data/part.bin") : QString());
+    if (!slot || !QDir().mkpath(slot->path() + QStringLiteral("/Half/data")) || !part.open(QIODevice::WriteOnly)
+        || part.write(QByteArray(4096, 'x')) != 4096)
         return 1;
     part.close();
     std::printf("%s\n", QFile::encodeName(slot->path()).constData());

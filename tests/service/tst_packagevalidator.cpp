@@ -1,6 +1,8 @@
+// What the service accepts before writing anything: entry names, packages, limits and its command line.
 #include "PackageArchive.h"
 #include "PackageLimits.h"
 #include "PackageValidator.h"
+#include "ServiceCommandLine.h"
 
 #include "store/SettingsStore.h"
 
@@ -15,74 +17,53 @@ namespace {
 
 EntryHeader Entry(const QString& path, Kind kind = Kind::File, qint64 size = 10)
 {
-    EntryHeader entry;
-    entry.path = path;
-    entry.kind = kind;
-    entry.size = kind == Kind::Folder ? 0 : size;
-    return entry;
+    return {.path = path, .kind = kind, .size = kind == Kind::Folder ? 0 : size, .modified = {}};
 }
 
-// Feeds the entries in order; the first refusal, or finish()'s answer.
-QString Validate(const QList<EntryHeader>& entries, const PackageLimits& limits = {}, qint64 packageBytes = 1 << 20)
+EntryHeader Odd(const QString& path, bool readable, bool sizeKnown, bool encrypted)
 {
-    PackageValidator validator(limits, packageBytes);
-    for (const EntryHeader& entry : entries)
-        if (const QString problem = validator.addEntry(entry); !problem.isEmpty())
-            return problem;
-    return validator.finish();
+    EntryHeader entry = Entry(path);
+    entry.pathReadable = readable, entry.sizeKnown = sizeKnown, entry.encrypted = encrypted;
+    return entry;
 }
 
 } // namespace
 
+// The refusal names its reason; an empty one stands for acceptance.
 #define COMPARE_REFUSAL(problem, refusal)                                                                              \
     QVERIFY2(refusal.isEmpty() ? problem.isEmpty() : problem.contains(refusal), qPrintable(problem))
 
 class TestPackageValidator : public QObject {
     Q_OBJECT
 private Q_SLOTS:
-    void entryNames_data()
-    {
-        QTest::addColumn<QString>("path");
-        QTest::addColumn<QString>("refusal"); // empty: accepted
-        QTest::newRow("plain") << u"Game/Game.exe"_s << QString();
-        QTest::newRow("unicode") << u"Jeu/Données/niveau.dat"_s << QString();
-        QTest::newRow("dotted name") << u"Game/.config"_s << QString();
-        QTest::newRow("empty") << QString() << u"without a name"_s;
-        QTest::newRow("absolute") << u"/etc/passwd"_s << u"absolute path"_s;
-        QTest::newRow("drive letter") << u"C:/Windows/evil.exe"_s << u"drive letter"_s;
-        QTest::newRow("drive relative") << u"c:evil.exe"_s << u"drive letter"_s;
-        QTest::newRow("stream") << u"Game/Game.exe:hidden"_s << u"not allowed"_s;
-        QTest::newRow("backslash") << u"Game\\..\\evil.exe"_s << u"backslash"_s;
-        QTest::newRow("parent") << u"Game/../../evil.exe"_s << u"outside its folder"_s;
-        QTest::newRow("current") << u"./Game/Game.exe"_s << u"outside its folder"_s;
-        QTest::newRow("double slash") << u"Game//Game.exe"_s << u"empty folder part"_s;
-        QTest::newRow("control character") << u"Game/a\nb.exe"_s << u"not allowed"_s;
-        QTest::newRow("wildcard") << u"Game/*.exe"_s << u"not allowed"_s;
-        QTest::newRow("trailing dot") << u"Game/Game.exe."_s << u"not allowed"_s;
-        QTest::newRow("trailing blank") << u"Game /Game.exe"_s << u"not allowed"_s;
-        QTest::newRow("device name") << u"Game/nul.txt"_s << u"not allowed"_s;
-        QTest::newRow("device com") << u"Game/COM3"_s << u"not allowed"_s;
-        QTest::newRow("not a device") << u"Game/COM0"_s << QString();
-        QTest::newRow("256 characters") << (u"Game/"_s + QString(256, u'a')) << u"too long"_s;
-        QTest::newRow("255 characters") << (u"Game/"_s + QString(255, u'a')) << QString();
-    }
-    void entryNames()
-    {
-        QFETCH(QString, path);
-        QFETCH(QString, refusal);
-        const QString problem = PackageValidator::pathProblem(path);
-        COMPARE_REFUSAL(problem, refusal);
-    }
-
     void packages_data()
     {
         QTest::addColumn<QList<EntryHeader>>("entries");
         QTest::addColumn<QString>("refusal");
         const EntryHeader exe = Entry(u"Game/Game.exe"_s);
         const EntryHeader folder = Entry(u"Game/"_s, Kind::Folder);
-        const auto with = [](EntryHeader entry, auto change) { return change(entry), entry; };
+        const auto named = [&](const QString& path) { return QList {exe, Entry(path)}; };
+        QTest::newRow("plain") << named(u"Game/Données/.niveau"_s) << QString();
+        QTest::newRow("empty") << named(QString()) << u"without a name"_s;
+        QTest::newRow("absolute") << named(u"/etc/passwd"_s) << u"absolute path"_s;
+        QTest::newRow("drive letter") << named(u"C:/Windows/evil.exe"_s) << u"drive letter"_s;
+        QTest::newRow("drive relative") << named(u"c:evil.exe"_s) << u"drive letter"_s;
+        QTest::newRow("stream") << named(u"Game/Game.exe:hidden"_s) << u"not allowed"_s;
+        QTest::newRow("backslash") << named(u"Game\\..\\evil.exe"_s) << u"backslash"_s;
+        QTest::newRow("parent") << named(u"Game/../../evil.exe"_s) << u"outside its folder"_s;
+        QTest::newRow("current") << named(u"./Game/Game.exe"_s) << u"outside its folder"_s;
+        QTest::newRow("double slash") << named(u"Game//Game.exe"_s) << u"empty folder part"_s;
+        QTest::newRow("control character") << named(u"Game/a\nb.exe"_s) << u"not allowed"_s;
+        QTest::newRow("wildcard") << named(u"Game/*.exe"_s) << u"not allowed"_s;
+        QTest::newRow("trailing dot") << named(u"Game/Game.exe."_s) << u"not allowed"_s;
+        QTest::newRow("trailing blank") << named(u"Game /Game.exe"_s) << u"not allowed"_s;
+        QTest::newRow("device name") << named(u"Game/nul.txt"_s) << u"not allowed"_s;
+        QTest::newRow("device com") << named(u"Game/COM3"_s) << u"not allowed"_s;
+        QTest::newRow("not a device") << named(u"Game/COM0"_s) << QString();
+        QTest::newRow("256 characters") << named((u"Game/"_s + QString(256, u'a'))) << u"too long"_s;
+        QTest::newRow("255 characters") << named((u"Game/"_s + QString(255, u'a'))) << QString();
         QTest::newRow("with folder entries")
-            << QList {folder, exe, Entry(u"Game/data/"_s, Kind::Folder), Entry(u"Game/data/x"_s)} << QString();
+            << QList {folder, folder, exe, Entry(u"Game/data/"_s, Kind::Folder), Entry(u"Game/data/x"_s)} << QString();
         QTest::newRow("flash game") << QList {Entry(u"Game/movie.SWF"_s)} << QString();
         QTest::newRow("empty") << QList<EntryHeader> {} << u"empty"_s;
         QTest::newRow("no game file") << QList {Entry(u"Game/readme.txt"_s)} << u"no .exe or .swf"_s;
@@ -98,16 +79,11 @@ private Q_SLOTS:
         QTest::newRow("symbolic link") << QList {exe, Entry(u"Game/link"_s, Kind::SymbolicLink)} << u"symbolic link"_s;
         QTest::newRow("hard link") << QList {exe, Entry(u"Game/link"_s, Kind::HardLink)} << u"hard link"_s;
         QTest::newRow("special") << QList {exe, Entry(u"Game/fifo"_s, Kind::Special)} << u"special file"_s;
-        QTest::newRow("unreadable name") << QList {with(exe, [](EntryHeader& e) { e.pathReadable = false; })}
-                                         << u"cannot be read"_s;
-        QTest::newRow("encrypted") << QList {exe, with(Entry(u"Game/d"_s), [](EntryHeader& e) { e.encrypted = true; })}
-                                   << u"encrypted"_s;
-        QTest::newRow("unknown size") << QList {exe,
-            with(Entry(u"Game/d"_s), [](EntryHeader& e) { e.sizeKnown = false; })}
-                                      << u"valid size"_s;
+        QTest::newRow("unreadable name") << QList {Odd(u"Game/Game.exe"_s, false, true, false)} << u"cannot be read"_s;
+        QTest::newRow("encrypted") << QList {exe, Odd(u"Game/d"_s, true, true, true)} << u"encrypted"_s;
+        QTest::newRow("unknown size") << QList {exe, Odd(u"Game/d"_s, true, false, false)} << u"valid size"_s;
         QTest::newRow("negative size") << QList {exe, Entry(u"Game/d"_s, Kind::File, -5)} << u"valid size"_s;
         QTest::newRow("same file in other case") << QList {exe, Entry(u"Game/GAME.EXE"_s)} << u"twice"_s;
-        QTest::newRow("same folder twice") << QList {folder, folder, exe} << QString();
         QTest::newRow("file then folder")
             << QList {exe, Entry(u"Game/data"_s), Entry(u"Game/data/x"_s)} << u"both as a file and as a folder"_s;
         QTest::newRow("folder then file")
@@ -119,28 +95,25 @@ private Q_SLOTS:
     {
         QFETCH(QList<EntryHeader>, entries);
         QFETCH(QString, refusal);
-        const QString problem = Validate(entries);
+        PackageValidator validator({}, 1 << 20);
+        QString problem;
+        for (qsizetype i = 0; problem.isEmpty() && i <= entries.size(); ++i)
+            problem = i < entries.size() ? validator.addEntry(entries.at(i)) : validator.finish();
         COMPARE_REFUSAL(problem, refusal);
     }
 
     void planKeepsArchiveOrderAndTotals()
     {
-        PackageLimits limits;
-        limits.maxUnpackedBytes = 3000;
-        limits.maxEntries = 4;
-        PackageValidator validator(limits, 2000);
-        QCOMPARE(validator.addEntry(Entry(u"Game/"_s, Kind::Folder)), QString());
-        QCOMPARE(validator.addEntry(Entry(u"Game/b.exe"_s, Kind::File, 1000)), QString());
-        QCOMPARE(validator.addEntry(Entry(u"Game/a.dat"_s, Kind::File, 2000)), QString());
+        PackageValidator validator({.maxUnpackedBytes = 3000, .maxRatio = 200, .maxEntries = 4}, 2000);
+        for (const EntryHeader& entry : {Entry(u"Game/"_s, Kind::Folder), Entry(u"Game/b.exe"_s, Kind::File, 1000),
+                 Entry(u"Game/a.dat"_s, Kind::File, 2000)})
+            QCOMPARE(validator.addEntry(entry), QString());
         QCOMPARE(validator.finish(), QString());
         const PackagePlan& plan = validator.plan();
-        QCOMPARE(plan.gameFolder, u"Game"_s);
-        QCOMPARE(plan.totalBytes, 3000);
-        QCOMPARE(plan.fileCount, 2);
-        QCOMPARE(plan.entries.size(), 3);
-        QCOMPARE(plan.entries.at(0).path, u"Game"_s);
+        QCOMPARE(plan.gameFolder + u' ' + plan.entries.at(0).path + u' ' + plan.entries.at(2).path,
+            u"Game Game Game/a.dat"_s);
         QVERIFY(plan.entries.at(0).folder);
-        QCOMPARE(plan.entries.at(2).path, u"Game/a.dat"_s);
+        QCOMPARE(QList({plan.totalBytes, plan.fileCount, plan.entries.size()}), QList<qint64>({3000, 2, 3}));
         // One byte over the total, one entry over the count.
         QVERIFY(validator.addEntry(Entry(u"Game/c"_s, Kind::File, 1)).contains(u"limit of"));
         QCOMPARE(validator.addEntry(Entry(u"Game/c"_s, Kind::File, 0)), QString());
@@ -150,51 +123,58 @@ private Q_SLOTS:
     // The ratio counts only once the package unpacks to more than a megabyte.
     void ratio()
     {
-        PackageLimits limits;
-        limits.maxRatio = 10;
-        QVERIFY(Validate({Entry(u"Game/Game.exe"_s, Kind::File, 1 << 20)}, limits, 1).isEmpty());
-        QVERIFY(Validate({Entry(u"Game/Game.exe"_s, Kind::File, 10 << 20)}, limits, 1 << 20).isEmpty());
-        QVERIFY(Validate({Entry(u"Game/Game.exe"_s, Kind::File, 11 << 20)}, limits, 1 << 20).contains(u"11 to 1"));
+        const auto problem = [](qint64 unpacked, qint64 packed) {
+            PackageValidator validator({.maxUnpackedBytes = qint64(1) << 40, .maxRatio = 10, .maxEntries = 10}, packed);
+            const QString refusal = validator.addEntry(Entry(u"Game/Game.exe"_s, Kind::File, unpacked));
+            return refusal.isEmpty() ? validator.finish() : refusal;
+        };
+        QCOMPARE(problem(1 << 20, 1), QString());
+        QCOMPARE(problem(10 << 20, 1 << 20), QString());
+        QVERIFY(problem(11 << 20, 1 << 20).contains(u"11 to 1"));
     }
 
-    void limitsFromSettings_data()
-    {
-        QTest::addColumn<QString>("megabytes");
-        QTest::addColumn<QString>("ratio");
-        QTest::addColumn<qint64>("expectedBytes");
-        QTest::addColumn<qint64>("expectedRatio");
-        const qint64 eightGigabytes = qint64(8) << 30;
-        QTest::newRow("absent: 8 GB, 200 to 1") << QString() << QString() << eightGigabytes << qint64(200);
-        QTest::newRow("set") << u" 100 "_s << u"50"_s << (qint64(100) << 20) << qint64(50);
-        QTest::newRow("zero keeps default") << u"0"_s << u"0"_s << eightGigabytes << qint64(200);
-        QTest::newRow("negative keeps default") << u"-1"_s << u"-7"_s << eightGigabytes << qint64(200);
-        QTest::newRow("text keeps default") << u"lots"_s << u"1e3"_s << eightGigabytes << qint64(200);
-        QTest::newRow("huge saturates") << u"9000000000000000"_s << u"9000000000000000"_s
-                                        << std::numeric_limits<qint64>::max() << qint64(9000000000000000);
-    }
     void limitsFromSettings()
     {
-        QFETCH(QString, megabytes);
-        QFETCH(QString, ratio);
         TestEnvironment environment;
-        if (!megabytes.isNull())
-            QVERIFY(SaveSetting(AppTitle(), u"Settings"_s, PackageLimitKeys::MaxUnpackedMegabytes, megabytes));
-        if (!ratio.isNull())
-            QVERIFY(SaveSetting(AppTitle(), u"Settings"_s, PackageLimitKeys::MaxCompressionRatio, ratio));
-        const PackageLimits limits = PackageLimits::fromSettings();
-        QTEST(limits.maxUnpackedBytes, "expectedBytes");
-        QTEST(limits.maxRatio, "expectedRatio");
+        const auto limits = [](const QString& megabytes, const QString& ratio) {
+            SaveSetting(AppTitle(), u"Settings"_s, PackageLimitKeys::MaxUnpackedMegabytes, megabytes);
+            SaveSetting(AppTitle(), u"Settings"_s, PackageLimitKeys::MaxCompressionRatio, ratio);
+            return QList {PackageLimits::fromSettings().maxUnpackedBytes, PackageLimits::fromSettings().maxRatio};
+        };
+        const QList<qint64> defaults {qint64(8) << 30, 200};
+        QCOMPARE(limits({}, {}), defaults);
+        QCOMPARE(limits(u" 100 "_s, u"50"_s), QList<qint64>({qint64(100) << 20, 50}));
+        QCOMPARE(limits(u"0"_s, u"-7"_s), defaults);
+        QCOMPARE(limits(u"9000000000000000"_s, u"lots"_s), QList<qint64>({std::numeric_limits<qint64>::max(), 200}));
     }
 
-    void garbageIsDamaged()
+    void commandLine_data()
     {
-        const QByteArray bytes("PK\x03\x04 this is not really a zip archive at all", 45);
-        PackageArchive archive;
-        archive.openMemory(bytes.constData(), size_t(bytes.size()));
-        PackagePlan plan;
-        const QString problem = ValidatePackage(archive, PackageLimits(), bytes.size(), plan);
-        QVERIFY2(problem.contains(u"damaged"), qPrintable(problem));
-        QVERIFY(plan.entries.isEmpty());
+        QTest::addColumn<QStringList>("arguments");
+        QTest::addColumn<ServiceCommand::Kind>("kind");
+        QTest::addColumn<QString>("package");
+        using enum ServiceCommand::Kind;
+        QTest::newRow("install") << QStringList {u"-I"_s, u"/tmp/a b.bvxpak"_s} << Install << u"/tmp/a b.bvxpak"_s;
+        QTest::newRow("install lower case") << QStringList {u"-i"_s, u"x.bvxpak"_s} << Install << u"x.bvxpak"_s;
+        QTest::newRow("install slash") << QStringList {u"/I"_s, u"x.bvxpak"_s} << Install << u"x.bvxpak"_s;
+        QTest::newRow("install quoted") << QStringList {u"-I"_s, u"\"x y.bvxpak\""_s} << Install << u"x y.bvxpak"_s;
+        QTest::newRow("install in pieces")
+            << QStringList {u"-I"_s, u"My"_s, u"Game.bvxpak"_s} << Install << u"My Game.bvxpak"_s;
+        QTest::newRow("install without package") << QStringList {u"-I"_s} << Usage << QString();
+        QTest::newRow("install empty") << QStringList {u"-I"_s, u"\"\""_s} << Usage << QString();
+        QTest::newRow("tidy") << QStringList {u"-U"_s} << Tidy << QString();
+        QTest::newRow("tidy with extra") << QStringList {u"-U"_s, u"now"_s} << Usage << QString();
+        QTest::newRow("after launch") << QStringList {u"-r"_s} << AfterLaunch << QString();
+        QTest::newRow("pack") << QStringList {u"--pack"_s, u"dir"_s, u"o.bvxpak"_s} << Pack << u"o.bvxpak"_s;
+        QTest::newRow("pack without output") << QStringList {u"--pack"_s, u"dir"_s} << Usage << QString();
+        QTest::newRow("long unknown") << QStringList {u"-Install"_s, u"x"_s} << Usage << QString();
+    }
+    void commandLine()
+    {
+        QFETCH(QStringList, arguments);
+        const ServiceCommand command = ParseServiceCommandLine(arguments);
+        QTEST(command.kind, "kind");
+        QTEST(command.package, "package");
     }
 };
 BV_REGISTER_TEST(TestPackageValidator);

@@ -1,55 +1,73 @@
+// The real service installing, packing and tidying up in a temporary tree; slot holders (slotholder.cpp) stand
+// for installs that run or were killed. The install in-process where the user can cancel it.
+#include "GameInstaller.h"
 #include "PackageLimits.h"
+#include "ProgressWindow.h"
+#include "StagingArea.h"
 
 #include "store/CatalogueKeys.h"
 #include "store/DataFolders.h"
+#include "store/InfoFiles.h"
 #include "store/SettingsStore.h"
 
 #include "Packages.h"
 #include "ProgramRun.h"
+#include "SmallFileSystem.h"
 #include "TestEnvironment.h"
 #include "TestFiles.h"
 #include "TestSuite.h"
 
+#include <QDialogButtonBox>
+#include <QLabel>
 #include <QProcess>
+#include <QProgressBar>
+#include <QPushButton>
+
+#include <list>
 
 #include <sys/stat.h>
 
 using namespace Brimvault;
 using namespace Qt::StringLiterals;
-using Files = QList<QPair<QString, QByteArray>>;
 
-// The real service installs and packs real packages in a temporary tree.
 class TestServiceInstall : public QObject {
     Q_OBJECT
     std::unique_ptr<TestEnvironment> m_env;
     QString m_games;
     QString m_packages;
+    std::list<QProcess> m_holders;
 
     static QString signal()
     {
         return GetSetting(AppTitle(), CatalogueKeys::CommandsSection, CatalogueKeys::NewGameInstalledKey, u"0"_s);
     }
-    static bool resetSignal()
-    {
-        return SaveSetting(AppTitle(), CatalogueKeys::CommandsSection, CatalogueKeys::NewGameInstalledKey, u"0"_s);
-    }
     QStringList gameFolders() const
     {
         return QDir(m_games).entryList(QDir::AllEntries | QDir::Hidden | QDir::NoDotAndDotDot);
     }
-    QString makeGame(const QString& name, const Files& files) const
+    // A game folder "name" of the given files, packed by the service; "" when it refused.
+    QString packGame(const QString& name, const QList<QPair<QString, QByteArray>>& files) const
     {
-        const QString folder
-            = m_env->path(u"sources/"_s + QString::number(qHash(name + files.first().first))) + u'/' + name;
+        const QString folder = m_env->path(u"sources/"_s + QString::number(qHash(files.first().second))) + u'/' + name;
         for (const auto& [relative, bytes] : files)
-            WriteFile(folder + u'/' + relative, bytes);
-        return folder;
-    }
-    // The package the service packs from the folder, or "" when it refused.
-    QString pack(const QString& folder, const QString& packageName) const
-    {
-        const QString package = m_packages + u'/' + packageName;
+            relative.endsWith(u'/') ? QDir().mkpath(folder + u'/' + relative)
+                                    : WriteFile(folder + u'/' + relative, bytes);
+        const QString package = folder + u".bvxpak"_s;
         return RunService({u"--pack"_s, folder, package}, nullptr) == 0 ? package : QString();
+    }
+    QString sourceOf(const QString& package) const { return package.chopped(7); }
+    // The folder of an install slot held by a new process, which also holds the games folder lock if asked.
+    QString holdSlot(bool holdGamesLock = false)
+    {
+        QProcess& holder = m_holders.emplace_back();
+        holder.start(
+            QStringLiteral(SLOT_HOLDER), holdGamesLock ? QStringList {m_games, u"lock"_s} : QStringList {m_games});
+        return holder.waitForReadyRead(30000) ? QString::fromLocal8Bit(holder.readLine()).trimmed() : QString();
+    }
+    void killAll()
+    {
+        for (QProcess& holder : m_holders)
+            holder.kill(), holder.waitForFinished();
     }
 
 private Q_SLOTS:
@@ -58,37 +76,36 @@ private Q_SLOTS:
         m_env = std::make_unique<TestEnvironment>();
         m_games = QDir::cleanPath(DataFolders::GamesFolder());
         m_packages = m_env->path(u"packages"_s);
-        QVERIFY(QDir().mkpath(m_packages));
-        QVERIFY(WriteFile(m_games + u"/Existing/Existing.exe"_s, "MZ existing"));
-        QVERIFY(resetSignal());
+        QVERIFY(QDir().mkpath(m_packages) && WriteFile(m_games + u"/Existing/Existing.exe"_s, "MZ existing"));
+        QVERIFY(SaveSetting(AppTitle(), CatalogueKeys::CommandsSection, CatalogueKeys::NewGameInstalledKey, u"0"_s));
     }
-    void cleanup() { m_env.reset(); }
+    void cleanup()
+    {
+        killAll();
+        m_holders.clear();
+        m_env.reset();
+    }
 
+    // A game reinstalled under another letter case replaces the folder it had.
     void packedGameInstalls()
     {
-        const QString source = makeGame(u"Space Rocks"_s,
-            {{u"Space Rocks.exe"_s, "MZ rocks"}, {u"Space Rocks.bvxinf"_s, "<Name>Space Rocks"},
-                {u"Données/niveau 1.dat"_s, RandomBytes(300000, 1)}, {u"empty.txt"_s, QByteArray()}});
-        QVERIFY(QDir(source).mkpath(u"saves"_s));
-        const QString package = pack(source, u"rocks.bvxpak"_s);
-        QVERIFY(!package.isEmpty());
-        QString output;
-        QCOMPARE(RunService({u"-I"_s, package}, &output), 0);
-        QCOMPARE(SnapshotTree(m_games + u"/Space Rocks"_s), SnapshotTree(source));
+        const QString package = packGame(u"EXISTING"_s,
+            {{u"Existing.exe"_s, "MZ rocks"}, {u"Données/niveau 1.dat"_s, RandomBytes(300000, 1)},
+                {u"empty.txt"_s, QByteArray()}, {u"saves/"_s, QByteArray()}});
+        QCOMPARE(RunService({u"-I"_s, package}, nullptr), 0);
+        QCOMPARE(SnapshotTree(m_games + u"/EXISTING"_s), SnapshotTree(sourceOf(package)));
+        QCOMPARE(gameFolders(), QStringList({u"EXISTING"_s}));
         QCOMPARE(signal(), u"1"_s);
-        QCOMPARE(gameFolders(), QStringList({u"Existing"_s, u"Space Rocks"_s}));
     }
 
-    // Refused before anything is written; the name rules themselves are the validator's table.
+    // Refused before anything is written; the name rules are the validator's table, a name reaching outside the
+    // end-to-end test's.
     void refused_data()
     {
         QTest::addColumn<QString>("kind");
         QTest::addColumn<QStringList>("settings"); // key, value, ...
         QTest::addColumn<QString>("reason");
         const QStringList none;
-        QTest::newRow("absolute path") << u"absolute"_s << none << u"absolute path"_s;
-        QTest::newRow("dot dot") << u"dotdot"_s << none << u"outside its folder"_s;
-        QTest::newRow("backslash") << u"backslash"_s << none << u"backslash"_s;
         QTest::newRow("symbolic link") << u"symlink"_s << none << u"symbolic link"_s;
         QTest::newRow("device") << u"device"_s << none << u"special file"_s;
         QTest::newRow("over the size limit")
@@ -113,8 +130,8 @@ private Q_SLOTS:
         for (qsizetype i = 0; i + 1 < settings.size(); i += 2)
             QVERIFY(SaveSetting(AppTitle(), CatalogueKeys::SettingsSection, settings.at(i), settings.at(i + 1)));
         const QString package = m_packages + u"/package.bvxpak"_s;
-        if (!kind.isEmpty())
-            QVERIFY2(CraftPackage(kind, package), "python3 could not write the package");
+        // Nor is the games folder made.
+        QVERIFY(QDir(m_games).removeRecursively() && (kind.isEmpty() || CraftPackage(kind, package)));
         const auto before = SnapshotTree(m_env->root());
         QString output;
         QCOMPARE(RunService({u"-I"_s, package}, &output), 1);
@@ -125,9 +142,8 @@ private Q_SLOTS:
     // libarchive reads a ZIP member marked as a pipe as a plain file; it must never become a pipe on disk.
     void pipeEntryLandsAsPlainFile()
     {
-        const QString package = m_packages + u"/pipe.bvxpak"_s;
-        QVERIFY(CraftPackage(u"fifo"_s, package));
-        QCOMPARE(RunService({u"-I"_s, package}, nullptr), 0);
+        QVERIFY(CraftPackage(u"fifo"_s, m_packages + u"/pipe.bvxpak"_s));
+        QCOMPARE(RunService({u"-I"_s, m_packages + u"/pipe.bvxpak"_s}, nullptr), 0);
         struct stat status { };
         QCOMPARE(::lstat(QFile::encodeName(m_games + u"/Game/pipe"_s).constData(), &status), 0);
         QVERIFY(S_ISREG(status.st_mode));
@@ -135,63 +151,51 @@ private Q_SLOTS:
 
     void reinstallReplacesOnlyWhenComplete()
     {
-        const QString first = makeGame(u"Game"_s, {{u"Game.exe"_s, "MZ one"}, {u"old.dat"_s, "old"}});
-        QCOMPARE(RunService({u"-I"_s, pack(first, u"one.bvxpak"_s)}, nullptr), 0);
+        QCOMPARE(
+            RunService({u"-I"_s, packGame(u"Game"_s, {{u"Game.exe"_s, "MZ one"}, {u"old.dat"_s, "old"}})}, nullptr), 0);
         const auto installed = SnapshotTree(m_games);
         const QString second
-            = makeGame(u"Game"_s, {{u"Game.exe"_s, "MZ two"}, {u"new.dat"_s, RandomBytes(2 << 20, 2)}});
-        const QString secondPackage = pack(second, u"two.bvxpak"_s);
-        QVERIFY(!secondPackage.isEmpty());
-
+            = packGame(u"Game"_s, {{u"Game.exe"_s, "MZ two"}, {u"new.dat"_s, RandomBytes(2 << 20, 2)}});
         // Damage the last member's data so the unpacking fails late, with most of the new copy written.
-        QByteArray bytes = ReadFile(secondPackage);
+        QByteArray bytes = ReadFile(second);
         const qsizetype middle = bytes.indexOf("Game/new.dat") + (3 << 19);
         for (qsizetype i = middle; i < middle + 256; ++i)
             bytes[i] = char(bytes[i] ^ 0x33);
         QVERIFY(WriteFile(m_packages + u"/broken.bvxpak"_s, bytes));
-        QVERIFY(resetSignal());
+        QVERIFY(SaveSetting(AppTitle(), CatalogueKeys::CommandsSection, CatalogueKeys::NewGameInstalledKey, u"0"_s));
         QString output;
         QCOMPARE(RunService({u"-I"_s, m_packages + u"/broken.bvxpak"_s}, &output), 1);
         QVERIFY2(output.contains(u"damaged"), qPrintable(output));
         QCOMPARE(SnapshotTree(m_games), installed);
         QCOMPARE(signal(), u"0"_s);
-
-        QCOMPARE(RunService({u"-I"_s, secondPackage}, nullptr), 0);
-        QCOMPARE(SnapshotTree(m_games + u"/Game"_s), SnapshotTree(second));
-        QCOMPARE(signal(), u"1"_s);
+        QCOMPARE(RunService({u"-I"_s, second}, nullptr), 0);
+        QCOMPARE(SnapshotTree(m_games + u"/Game"_s), SnapshotTree(sourceOf(second)));
         QCOMPARE(gameFolders(), QStringList({u"Existing"_s, u"Game"_s}));
-    }
-
-    void reinstallMatchesFolderInAnyCase()
-    {
-        const QString source = makeGame(u"EXISTING"_s, {{u"Existing.exe"_s, "MZ new"}});
-        QCOMPARE(RunService({u"-I"_s, pack(source, u"upper.bvxpak"_s)}, nullptr), 0);
-        QCOMPARE(gameFolders(), QStringList({u"EXISTING"_s}));
-        QCOMPARE(SnapshotTree(m_games + u"/EXISTING"_s), SnapshotTree(source));
     }
 
     void concurrentInstallsBothLand()
     {
-        const QString north = makeGame(u"North"_s,
-            {{u"North.exe"_s, "MZ north"}, {u"a.dat"_s, RandomBytes(12 << 20, 3)},
-                {u"b.dat"_s, RandomBytes(12 << 20, 4)}});
-        const QString south = makeGame(u"South"_s,
-            {{u"South.exe"_s, "MZ south"}, {u"a.dat"_s, RandomBytes(12 << 20, 5)},
-                {u"b.dat"_s, RandomBytes(12 << 20, 6)}});
-        const QString northPackage = pack(north, u"north.bvxpak"_s);
-        const QString southPackage = pack(south, u"south.bvxpak"_s);
-        QVERIFY(!northPackage.isEmpty() && !southPackage.isEmpty());
-        QProcess first;
-        QProcess second;
-        first.start(ServicePath(), {u"-I"_s, northPackage});
-        second.start(ServicePath(), {u"-I"_s, southPackage});
-        QVERIFY(first.waitForFinished(120000) && second.waitForFinished(120000));
-        QCOMPARE(first.exitCode(), 0);
-        QCOMPARE(second.exitCode(), 0);
-        // Large packages report their progress on standard error when there is no display.
-        QVERIFY(first.readAllStandardError().contains("Unpacking: 100%"));
-        QCOMPARE(SnapshotTree(m_games + u"/North"_s), SnapshotTree(north));
-        QCOMPARE(SnapshotTree(m_games + u"/South"_s), SnapshotTree(south));
+        const QStringList names {u"North"_s, u"South"_s};
+        QStringList packages;
+        for (const QString& name : names)
+            packages << packGame(name,
+                {{name + u".exe"_s, "MZ"}, {u"a.dat"_s, RandomBytes(12 << 20, packages.size())},
+                    {u"b.dat"_s, RandomBytes(12 << 20, 2 + packages.size())}});
+        QProcess services[2];
+        for (int i = 0; i < 2; ++i)
+            services[i].start(ServicePath(), {u"-I"_s, packages.at(i)});
+        for (int i = 0; i < 2; ++i) {
+            QVERIFY(services[i].waitForFinished(120000));
+            QCOMPARE(services[i].exitCode(), 0);
+            // Large packages report their progress on standard error when there is no display.
+            const QString errors = QString::fromLocal8Bit(services[i].readAllStandardError());
+            QVERIFY2(errors.startsWith(u"Installing \"%1\" (24 MB)...\n"_s.arg(names.at(i)))
+                    && errors.contains(u"Unpacking: 50%\nUnpacking: 60%\n")
+                    && errors.endsWith(
+                        u"Unpacking: 100%\nFinishing the installation of \"%1\"...\n"_s.arg(names.at(i))),
+                qPrintable(errors));
+            QCOMPARE(SnapshotTree(m_games + u'/' + names.at(i)), SnapshotTree(sourceOf(packages.at(i))));
+        }
         QCOMPARE(gameFolders(), QStringList({u"Existing"_s, u"North"_s, u"South"_s}));
         QCOMPARE(signal(), u"1"_s);
     }
@@ -222,25 +226,170 @@ private Q_SLOTS:
         QString output;
         QCOMPARE(RunService({u"--pack"_s, folder, package}, &output), 1);
         QVERIFY2(output.contains(reason), qPrintable(output));
-        QVERIFY(!QFileInfo::exists(package));
-        QVERIFY(QDir(m_packages).isEmpty(QDir::AllEntries | QDir::Hidden | QDir::NoDotAndDotDot));
+        QVERIFY(!QFileInfo::exists(package)
+            && QDir(m_packages).isEmpty(QDir::AllEntries | QDir::Hidden | QDir::NoDotAndDotDot));
     }
 
-    // What each command line means is the parser's table; here the real service on a wrong one.
-    void badCommandLine_data()
+    // The games folder on a small file system of its own.
+    void packageLargerThanTheDisk_data()
     {
-        QTest::addColumn<QStringList>("arguments");
-        QTest::newRow("nothing") << QStringList();
-        QTest::newRow("unknown switch") << QStringList {u"-X"_s};
+        QTest::addColumn<QString>("options");
+        QTest::addColumn<int>("files");
+        QTest::addColumn<int>("fileSize");
+        QTest::addColumn<QString>("reason");
+        QTest::newRow("asked before unpacking") << u"size=8m"_s << 1 << (12 << 20) << u"MB are free"_s;
+        // Room in bytes but not in files: the disk fills while unpacking.
+        QTest::newRow("full while unpacking") << u"size=64m,nr_inodes=16"_s << 40 << 1024 << u"not enough free space"_s;
     }
-    void badCommandLine()
+    void packageLargerThanTheDisk()
     {
-        QFETCH(QStringList, arguments);
-        const auto before = SnapshotTree(m_env->root());
+        QFETCH(QString, options);
+        QFETCH(int, files);
+        QFETCH(int, fileSize);
+        QFETCH(QString, reason);
+        const QString source = m_env->path(u"source/Big Game"_s);
+        for (int i = 0; i < files; ++i)
+            QVERIFY(WriteFile(source + u"/part%1.exe"_s.arg(i), RandomBytes(fileSize, quint32(i))));
+        QCOMPARE(RunService({u"--pack"_s, source, m_packages + u"/big.bvxpak"_s}, nullptr), 0);
+        SmallFileSystem disk(m_env->path(u"commonappdata"_s), options);
+        QVERIFY2(disk.isMounted(), qPrintable(disk.error()));
+        QVERIFY(WriteFile(m_games + u"/Existing/Existing.exe"_s, "MZ existing"));
+        const auto before = SnapshotTree(m_games);
         QString output;
-        QCOMPARE(RunService(arguments, &output), 2);
+        QCOMPARE(RunService({u"-I"_s, m_packages + u"/big.bvxpak"_s}, &output), 1);
+        QVERIFY2(output.contains(u"not enough free space") && output.contains(reason), qPrintable(output));
+        QCOMPARE(SnapshotTree(m_games), before);
+        QCOMPARE(signal(), u"0"_s);
+    }
+
+    // At start (-U) and after a launch (-R) alike, silently: what killed installs left goes, a running one stays.
+    void tidy_data()
+    {
+        QTest::addColumn<QString>("command");
+        QTest::newRow("at start") << u"-U"_s;
+        QTest::newRow("after a launch") << u"-R"_s;
+    }
+    void tidy()
+    {
+        QFETCH(QString, command);
+        const auto clean = SnapshotTree(m_games);
+        const QString running = holdSlot();
+        const QString killed = holdSlot();
+        // Killed while it held the games folder lock, as during a final rename.
+        const QString locking = holdSlot(true);
+        QVERIFY(!running.isEmpty() && !killed.isEmpty() && !locking.isEmpty());
+        // A hidden name is not enough on every system: the stop mark keeps the folder walk out.
+        const QString staging = QFileInfo(running).absolutePath();
+        QCOMPARE(QFileInfo(staging).absolutePath(), m_games);
+        QVERIFY(QFileInfo(staging).fileName().startsWith(u'.') && InfoFiles::IsStopFolder(staging));
+        for (auto holder = std::next(m_holders.begin()); holder != m_holders.end(); ++holder)
+            holder->kill(), holder->waitForFinished();
+        QVERIFY(QFileInfo::exists(killed + u"/Half/data/part.bin"_s)
+            && QFileInfo::exists(m_games + u"/.bvxinstall.lock"_s));
+        // A slot whose lock file never got written is a leftover too.
+        QVERIFY(QFile::remove(locking + u".lock"_s));
+        const auto runningBefore = SnapshotTree(running);
+        QString output;
+        QCOMPARE(RunService({command}, &output), 0);
+        QCOMPARE(output, QString());
+        QCOMPARE(SnapshotTree(running), runningBefore);
+        QVERIFY(QFileInfo::exists(running + u".lock"_s) && !QFileInfo::exists(killed) && !QFileInfo::exists(locking));
+        QVERIFY(!QFileInfo::exists(m_games + u"/.bvxinstall.lock"_s));
+        killAll();
+        QCOMPARE(RunService({command}, nullptr), 0);
+        QCOMPARE(SnapshotTree(m_games), clean);
+    }
+
+    // Without a games folder, or with a staging folder that is a link elsewhere, nothing is touched.
+    void tidyTouchesNothingElse_data()
+    {
+        QTest::addColumn<bool>("stagingLink");
+        QTest::newRow("no games folder") << false;
+        QTest::newRow("staging folder is a link") << true;
+    }
+    void tidyTouchesNothingElse()
+    {
+        QFETCH(bool, stagingLink);
+        if (stagingLink)
+            QVERIFY(WriteFile(m_env->path(u"elsewhere/install-1-a/keep.txt"_s), "not ours")
+                && QFile::link(m_env->path(u"elsewhere"_s), StagingFolderPath(m_games)));
+        else
+            QVERIFY(QDir(m_games).removeRecursively());
+        const auto before = SnapshotTree(m_env->root());
+        for (const QString& command : {u"-U"_s, u"-R"_s}) {
+            QString output;
+            QCOMPARE(RunService({command}, &output), 0);
+            QCOMPARE(output, QString());
+        }
+        // Nor does a wrong command line, which gets the usage.
+        QString output;
+        QCOMPARE(RunService({u"-X"_s}, &output), 2);
         QVERIFY(output.contains(u"Usage"));
         QCOMPARE(SnapshotTree(m_env->root()), before);
+    }
+
+    // In-process, where the user can cancel.
+    void cancelLeavesGamesFolderAsItWas_data()
+    {
+        QTest::addColumn<bool>("reinstall");
+        QTest::newRow("new game") << false;
+        QTest::newRow("reinstall") << true;
+    }
+    void cancelLeavesGamesFolderAsItWas()
+    {
+        QFETCH(bool, reinstall);
+        QVERIFY(!reinstall || WriteFile(m_games + u"/Cancel/Cancel.exe"_s, "MZ old"));
+        const QString package
+            = packGame(u"Cancel"_s, {{u"Cancel.exe"_s, "MZ new"}, {u"a.bin"_s, RandomBytes(4 << 20, 9)}});
+        const auto before = SnapshotTree(m_games);
+        int calls = 0;
+        const InstallResult result
+            = InstallPackage(package, [&](qint64 done, qint64 total) { return ++calls, done < total / 2; });
+        QVERIFY(result.cancelled && !result.succeeded() && !result.signalled && calls > 1);
+        QCOMPARE(SnapshotTree(m_games), before);
+        QVERIFY(!QFileInfo::exists(StagingFolderPath(m_games)));
+    }
+
+    // A file where the game's folder goes, or a staging folder that is a link: nothing anywhere changes.
+    void nothingChanges_data()
+    {
+        QTest::addColumn<bool>("stagingLink");
+        QTest::newRow("game folder is a file") << false;
+        QTest::newRow("staging folder is a link") << true;
+    }
+    void nothingChanges()
+    {
+        QFETCH(bool, stagingLink);
+        QVERIFY(stagingLink ? QDir().mkpath(m_env->path(u"elsewhere"_s)) && QDir().mkpath(m_games)
+                    && QFile::link(m_env->path(u"elsewhere"_s), StagingFolderPath(m_games))
+                            : WriteFile(m_games + u"/Game"_s, "a file, not a game folder"));
+        const QString package = packGame(u"Game"_s, {{u"Game.exe"_s, "MZ"}});
+        const auto before = SnapshotTree(m_env->root());
+        const InstallResult result = InstallPackage(package);
+        QVERIFY(stagingLink ? !result.succeeded() : result.problem.contains(u"not a game folder"));
+        QCOMPARE(SnapshotTree(m_env->root()), before);
+    }
+
+    // Finishing cannot be cancelled; before it, the Cancel button or closing the window stops the install, and
+    // the window stays until the unpacking has stopped and cleaned up behind itself.
+    void progressWindow()
+    {
+        ProgressWindow window;
+        window.setGame(u"Space Rocks"_s);
+        window.show();
+        QVERIFY(QTest::qWaitForWindowExposed(&window) && window.findChild<QLabel*>()->text().contains(u"Space Rocks"));
+        auto* bar = window.findChild<QProgressBar*>();
+        QTRY_VERIFY_WITH_TIMEOUT((window.showProgress(250, 1000), bar->value() == bar->maximum() / 4), 2000);
+        QTRY_VERIFY_WITH_TIMEOUT((window.showProgress(1000, 1000), bar->value() == bar->maximum()), 2000);
+        auto* buttons = window.findChild<QDialogButtonBox*>();
+        QTest::mouseClick(buttons->button(QDialogButtonBox::Cancel), Qt::LeftButton);
+        QVERIFY(window.cancelled() && window.isVisible() && !window.showProgress(2, 10));
+        window.setFinishing();
+        QVERIFY(!buttons->isEnabled());
+        ProgressWindow closed;
+        closed.show();
+        closed.close();
+        QVERIFY(closed.cancelled() && closed.isVisible());
     }
 };
 BV_REGISTER_TEST(TestServiceInstall);
