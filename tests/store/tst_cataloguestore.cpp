@@ -63,6 +63,7 @@ private Q_SLOTS:
                 answers += QString::number(InfoFiles::IsStopFolder(folder + end));
             return answers;
         };
+        const auto infoFile = &InfoFiles::GameInfoFileName;
         QTest::newRow("counter not a number") << addTo("Count=abc\nFile1=/1\nFile2=/2") << u"File3|3|3"_s;
         QTest::newRow("counter with blanks") << addTo("Count= 7 ") << u"File8|8|1"_s;
         QTest::newRow("counter too low") << addTo("Count=1\nFile1=/1\nfile4=/4") << u"File5|5|3"_s;
@@ -78,15 +79,12 @@ private Q_SLOTS:
         QTest::newRow("path with blanks") << lookUp(u"\tC:\\Games\\Lines.EXE  "_s) << u"File2|File2|3"_s;
         QTest::newRow("non-ASCII path") << lookUp(u"/ИГРЫ/линии.EXE"_s) << u"File4|File4|3"_s;
         QTest::newRow("inner blank differs") << lookUp(u"C:\\Games\\Li nes.exe"_s) << u"||3"_s;
-        QTest::newRow("info file of a Windows path")
-            << InfoFiles::GameInfoFileName(u"C:\\Games\\foo.exe"_s) << u"C:\\Games\\foo.bvxinf"_s;
-        QTest::newRow("info file of a bare name") << InfoFiles::GameInfoFileName(u"foo.exe"_s) << u".\\foo.bvxinf"_s;
-        QTest::newRow("info file, dot in folder only")
-            << InfoFiles::GameInfoFileName(u"C:\\a.b\\file"_s) << u"C:\\a.b\\file.bvxinf"_s;
+        QTest::newRow("info file of a Windows path") << infoFile(u"C:\\Games\\foo.exe"_s) << u"C:\\Games\\foo.bvxinf"_s;
+        QTest::newRow("info file of a bare name") << infoFile(u"foo.exe"_s) << u".\\foo.bvxinf"_s;
+        QTest::newRow("info file, dot in folder only") << infoFile(u"C:\\a.b\\file"_s) << u"C:\\a.b\\file.bvxinf"_s;
         QTest::newRow("info file of an address, query cut first")
-            << InfoFiles::GameInfoFileName(u"http://s/g.swf?x=1/2"_s) << u"http://s/g.bvxinf"_s;
-        QTest::newRow("info file, name is extension only")
-            << InfoFiles::GameInfoFileName(u"dir/.hidden"_s) << u"dir/.bvxinf"_s;
+            << infoFile(u"http://s/g.swf?x=1/2"_s) << u"http://s/g.bvxinf"_s;
+        QTest::newRow("info file, name is extension only") << infoFile(u"dir/.hidden"_s) << u"dir/.bvxinf"_s;
         const QByteArray both("<>Name<\xd0\x9b\xd0\xb8\xd0\xbd\xd0\xb8\xd0\xb8\r\n<>Name_ENG<Lines");
         QTest::newRow("name in the language") << infoName(both, u"ENG"_s, u"lines.exe"_s) << u"Lines"_s;
         QTest::newRow("name of other language falls back") << infoName(both, u"RUS"_s, u"lines.exe"_s) << u"Линии"_s;
