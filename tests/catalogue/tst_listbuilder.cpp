@@ -2,17 +2,15 @@
 #include "catalogue/ListBuilder.h"
 #include "i18n/modLocalizer.h"
 #include "store/DataFolders.h"
-#include "store/SettingsStore.h"
 
 #include "CatalogueFiles.h"
-#include "CatalogueIcon.h"
+#include "PeFixtures.h"
 #include "TestEnvironment.h"
 #include "TestFiles.h"
 #include "TestSuite.h"
 
 using namespace Brimvault;
 using namespace Qt::StringLiterals;
-using Records = QList<QPair<QString, QString>>;
 
 namespace {
 
@@ -24,11 +22,6 @@ GameEntry ListOne(const QString& path, bool keepPictures = true)
     return builder.AddGameToList(path);
 }
 
-bool Save(const QString& section, const QString& key, const QString& value)
-{
-    return SaveSetting(AppTitle(), section, key, value);
-}
-
 } // namespace
 
 class TestListBuilder : public QObject {
@@ -36,124 +29,83 @@ class TestListBuilder : public QObject {
 private Q_SLOTS:
     void initTestCase() { modLocalizer::UseBuiltInLanguage(); }
 
-    // Each row takes the first source that has a name: user, info file, zone table, version text, file title.
-    void caption_data()
+    void entries_data()
     {
-        QTest::addColumn<QString>("fileName");
-        QTest::addColumn<QString>("fixture"); // "" for a plain file, else pe/<name> or catalogue/<name>
-        QTest::addColumn<QString>("userName");
-        QTest::addColumn<Records>("info");
+        QTest::addColumn<QString>("actual");
         QTest::addColumn<QString>("expected");
-        const Records none;
-        const Records hearts {{u"Name"_s, u"Info Hearts"_s}};
-        QTest::newRow("user name first") << u"hrtzzm.exe"_s << QString() << u"My Hearts"_s << hearts << u"My Hearts"_s;
+        // A game file (plain, or a copy of a built fixture: pe/<name> or catalogue/<name>) with a user's name and
+        // an info file. The user's name belongs to the entry whose path matches after trimming and in any case;
+        // of a name key written twice by hand the first counts.
+        const auto caption = [](const QString& fileName, const QString& fixture, const QByteArray& userName = {},
+                                 const QByteArray& info = {}) -> QString {
+            TestEnvironment env;
+            const QString path = env.path(u"games/"_s + fileName);
+            const QString built
+                = fixture.startsWith(u"pe/") ? PeFixture(fixture.mid(3)) : CatalogueFixture(fixture.mid(10));
+            if (fixture.isEmpty() ? !WriteFile(path) : !CopyFixture(built, path))
+                return u"missing the executable fixtures (mingw-w64): build them with make test"_s;
+            if (!info.isEmpty())
+                WriteFile(path.chopped(4) + u".BVXINF"_s, info);
+            WriteFile(env.settingsFile(),
+                "[Files]\nFILE7=  " + path.toUpper().toUtf8() + "\nFile8=" + env.path(u"x"_s).toUtf8()
+                    + "\n[FilesNames]\n"
+                    + (userName.isEmpty() ? QByteArray() : "filename7=" + userName + "\nFileName7=Wrong\n")
+                    + "FileName8=Wrong\n");
+            return ListOne(path).caption;
+        };
+        // Where the icon comes from, the file shown and its width; v: a valid icon file, c: a corrupt one.
+        const auto icon = [](const QString& fileName, char own, char cache) -> QString {
+            TestEnvironment env;
+            const QByteArray valid = ValidIconFile();
+            if (valid.isEmpty())
+                return u"missing the PE fixture multi64.exe (mingw-w64): build it with make test"_s;
+            const QString path = env.path(u"games/"_s + fileName);
+            const QString ownFile = path.left(path.lastIndexOf(u'.')) + u".ICO"_s;
+            const QString cacheFile = IconCacheFile(DataFolders::IconsFolder(), path);
+            WriteFile(path);
+            if (own != '-')
+                WriteFile(ownFile, own == 'v' ? valid : valid.left(40));
+            if (cache != '-')
+                WriteFile(cacheFile, cache == 'v' ? valid : valid.left(40));
+            const GameEntry entry = ListOne(path);
+            // The command line asks for the decision without the picture.
+            const GameEntry bare = ListOne(path, false);
+            return IconSourceName(entry.source) + u' ' + QString::number(entry.picture.width())
+                + (entry.iconFile == ownFile          ? u" own"_s
+                        : entry.iconFile == cacheFile ? u" cache"_s
+                                                      : entry.iconFile)
+                + (bare.source == entry.source && bare.picture.isNull() ? QString() : u" differs bare"_s);
+        };
+        // Each takes the first source that has a name: user, info file, zone table, version text, file title.
+        QTest::newRow("user name first") << caption(u"hrtzzm.exe"_s, {}, "My Hearts", "<>Name<Info Hearts")
+                                         << u"My Hearts"_s;
         QTest::newRow("info file before zone table")
-            << u"hrtzzm.exe"_s << QString() << QString() << hearts << u"Info Hearts"_s;
-        QTest::newRow("info file in the current language")
-            << u"game.exe"_s << QString() << QString()
-            << Records {{u"Name"_s, u"Any Language"_s}, {u"Name_ENG"_s, u"  English Name  "_s}} << u"English Name"_s;
-        QTest::newRow("info file language record blank")
-            << u"game.exe"_s << QString() << QString()
-            << Records {{u"Name"_s, u" Any Language "_s}, {u"Name_ENG"_s, u"   "_s}} << u"Any Language"_s;
+            << caption(u"hrtzzm.exe"_s, {}, {}, "<>Name<Info Hearts") << u"Info Hearts"_s;
         QTest::newRow("info file of another language only")
-            << u"game.exe"_s << QString() << QString() << Records {{u"Name_RUS"_s, u"Igra"_s}} << u"game"_s;
-        QTest::newRow("zone table") << u"hrtzzm.exe"_s << QString() << QString() << none << u"Internet Chervi"_s;
+            << caption(u"game.exe"_s, {}, {}, "<>Name_RUS<Igra") << u"game"_s;
         QTest::newRow("zone member without row falls to version")
-            << u"zm.exe"_s << u"pe/multi64.exe"_s << QString() << none << u"Marble Cascade"_s;
+            << caption(u"zm.exe"_s, u"pe/multi64.exe"_s) << u"Marble Cascade"_s;
         QTest::newRow("version text with russian prefix")
-            << u"chess.exe"_s << u"catalogue/ru_prefix.exe"_s << QString() << none << u"Chess"_s;
+            << caption(u"chess.exe"_s, u"catalogue/ru_prefix.exe"_s) << u"Chess"_s;
         QTest::newRow("long version text trimmed, cut and broken")
-            << u"long.exe"_s << u"catalogue/long_desc.exe"_s << QString() << none
-            << u"SuperMegaUlt raExtremeHyp erDelu..."_s;
+            << caption(u"long.exe"_s, u"catalogue/long_desc.exe"_s) << u"SuperMegaUlt raExtremeHyp erDelu..."_s;
         QTest::newRow("version without description")
-            << u"nodesc.exe"_s << u"pe/ver_nodesc64.exe"_s << QString() << none << u"nodesc"_s;
-        QTest::newRow("no resources") << u"Arcade.exe"_s << u"pe/nores64.exe"_s << QString() << none << u"Arcade"_s;
-        QTest::newRow("long file title broken")
-            << u"VeryLongGameTitle.exe"_s << QString() << QString() << none << u"VeryLongGame Title"_s;
+            << caption(u"nodesc.exe"_s, u"pe/ver_nodesc64.exe"_s) << u"nodesc"_s;
+        QTest::newRow("no resources") << caption(u"Arcade.exe"_s, u"pe/nores64.exe"_s) << u"Arcade"_s;
         QTest::newRow("user name is tidied too")
-            << u"g.exe"_s << QString() << u"Исполняемый файл для игры Шашки"_s << none << u"Шашки"_s;
+            << caption(u"g.exe"_s, {}, u"Исполняемый файл для игры Шашки"_s.toUtf8()) << u"Шашки"_s;
+        QTest::newRow("own icon wins over cache") << icon(u"a.exe"_s, 'v', 'v') << u"file 32 own"_s;
+        QTest::newRow("corrupt own icon queues, cache or not") << icon(u"a.exe"_s, 'c', 'v') << u"queued 0"_s;
+        QTest::newRow("cache") << icon(u"a.exe"_s, '-', 'v') << u"cache 32 cache"_s;
+        QTest::newRow("corrupt cache") << icon(u"a.exe"_s, '-', 'c') << u"queued 0"_s;
+        QTest::newRow("nothing") << icon(u"a.exe"_s, '-', '-') << u"queued 0"_s;
+        QTest::newRow("flash with corrupt cache") << icon(u"movie.SWF"_s, '-', 'c') << u"flash 0"_s;
+        QTest::newRow("flash with own icon") << icon(u"movie.swf"_s, 'v', '-') << u"file 32 own"_s;
     }
-    void caption()
+    void entries()
     {
-        QFETCH(QString, fileName);
-        QFETCH(QString, fixture);
-        QFETCH(QString, userName);
-        QFETCH(Records, info);
-        TestEnvironment env;
-        const QString path = env.path(u"games/"_s + fileName);
-        if (fixture.isEmpty())
-            QVERIFY(WriteFile(path));
-        else
-            REQUIRE_FIXTURE(
-                CopyFixture(
-                    fixture.startsWith(u"pe/") ? PeFixture(fixture.mid(3)) : CatalogueFixture(fixture.mid(10)), path),
-                "the executable fixtures (mingw-w64)");
-        if (!info.isEmpty())
-            QVERIFY(WriteInfoFile(path.chopped(4) + u".bvxinf"_s, info));
-        QVERIFY(Save(u"Files"_s, u"File7"_s, path) && Save(u"Files"_s, u"File8"_s, env.path(u"x"_s)));
-        if (!userName.isEmpty())
-            QVERIFY(
-                Save(u"FilesNames"_s, u"FileName7"_s, userName) && Save(u"FilesNames"_s, u"FileName8"_s, u"Wrong"_s));
-        const GameEntry entry = ListOne(path);
-        QTEST(entry.caption, "expected");
-        QCOMPARE(entry.path, path);
-    }
-
-    // The user's name is found for the entry whose path matches after trimming and in any case, and a
-    // name key written twice by hand shows the first one, as renaming and removing read it.
-    void userNameLookup()
-    {
-        TestEnvironment env;
-        const QString path = env.path(u"games/Game.exe"_s);
-        QVERIFY(WriteFile(env.settingsFile(),
-            "[Files]\r\nCount=12\r\nFILE12=  " + path.toUpper().toUtf8()
-                + "\r\n[FilesNames]\r\nfilename12=First\r\nFileName12=Second\r\n"));
-        ListBuilder builder(DataFolders::IconsFolder());
-        builder.beginPass();
-        QCOMPARE(builder.AddGameToList(path).caption, u"First"_s);
-        QCOMPARE(builder.AddGameToList(env.path(u"games/Other.exe"_s)).caption, u"Other"_s);
-    }
-
-    void icon_data()
-    {
-        QTest::addColumn<QString>("fileName");
-        QTest::addColumn<QString>("ownIcon"); // "", "valid" or "corrupt"
-        QTest::addColumn<QString>("cacheIcon");
-        QTest::addColumn<IconSource>("expected");
-        QTest::newRow("own icon wins over cache") << u"a.exe"_s << u"valid"_s << u"valid"_s << IconSource::File;
-        QTest::newRow("corrupt own icon queues, cache or not")
-            << u"a.exe"_s << u"corrupt"_s << u"valid"_s << IconSource::Queued;
-        QTest::newRow("cache") << u"a.exe"_s << u""_s << u"valid"_s << IconSource::Cache;
-        QTest::newRow("corrupt cache") << u"a.exe"_s << u""_s << u"corrupt"_s << IconSource::Queued;
-        QTest::newRow("nothing") << u"a.exe"_s << u""_s << u""_s << IconSource::Queued;
-        QTest::newRow("flash with corrupt cache") << u"movie.SWF"_s << u""_s << u"corrupt"_s << IconSource::Flash;
-        QTest::newRow("flash with own icon") << u"movie.swf"_s << u"valid"_s << u""_s << IconSource::File;
-    }
-    void icon()
-    {
-        QFETCH(QString, fileName);
-        QFETCH(QString, ownIcon);
-        QFETCH(QString, cacheIcon);
-        QFETCH(IconSource, expected);
-        TestEnvironment env;
-        const QByteArray valid = ValidIconFile();
-        REQUIRE_FIXTURE(!valid.isEmpty(), "the PE fixture multi64.exe (mingw-w64)");
-        const QString path = env.path(u"games/"_s + fileName);
-        const QString ownFile = path.left(path.lastIndexOf(u'.')) + u".ico"_s;
-        const QString cacheFile = IconCacheFile(DataFolders::IconsFolder(), path);
-        QVERIFY(WriteFile(path));
-        if (!ownIcon.isEmpty())
-            QVERIFY(WriteFile(ownFile, ownIcon == u"valid" ? valid : valid.left(40)));
-        if (!cacheIcon.isEmpty())
-            QVERIFY(WriteFile(cacheFile, cacheIcon == u"valid" ? valid : valid.left(40)));
-        const GameEntry entry = ListOne(path);
-        QCOMPARE(entry.source, expected);
-        const bool shown = expected == IconSource::File || expected == IconSource::Cache;
-        QCOMPARE(entry.iconFile, shown ? (expected == IconSource::File ? ownFile : cacheFile) : QString());
-        QCOMPARE(entry.picture.width(), shown ? 32 : 0);
-        // The command line asks for the decision without the picture.
-        QCOMPARE(ListOne(path, false).source, expected);
-        QVERIFY(ListOne(path, false).picture.isNull());
+        QFETCH(QString, actual);
+        QTEST(actual, "expected");
     }
 
     void knownPaths()
@@ -169,19 +121,6 @@ private Q_SLOTS:
         QVERIFY(!builder.IsGameListed(env.path(u"Games/Game"_s)));
         builder.beginPass();
         QVERIFY(!builder.IsGameListed(path));
-    }
-
-    void onlineEntry()
-    {
-        TestEnvironment env;
-        qputenv("BRIMVAULT_CATALOGUE_ROOT", "http://games.example.org/");
-        ListBuilder builder(DataFolders::IconsFolder());
-        builder.beginPass();
-        const GameEntry entry = builder.OnlineGamesEntry();
-        QCOMPARE(entry.caption, u"Online games"_s);
-        QCOMPARE(entry.path, u"http://games.example.org/online-games-catalog.asp"_s);
-        QCOMPARE(entry.source, IconSource::Online);
-        QVERIFY(!builder.IsGameListed(entry.path));
     }
 };
 BV_REGISTER_TEST(TestListBuilder);

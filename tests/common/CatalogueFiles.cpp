@@ -1,25 +1,12 @@
 #include "CatalogueFiles.h"
 
-#include "store/clsFileBag.h"
+#include "icons/cFileIcon.h"
+
+#include "PeFixtures.h"
 
 #include <QDir>
 #include <QFile>
 #include <QFileInfo>
-
-bool WriteInfoFile(const QString& path, const QList<QPair<QString, QString>>& records)
-{
-    QDir().mkpath(QFileInfo(path).absolutePath());
-    Brimvault::clsFileBag bag;
-    for (const auto& [key, value] : records)
-        bag.SetRecord(Brimvault::clsFileBag::MakeKey(key), value);
-    bag.SetCurrentFileName(path);
-    return bag.SaveFile();
-}
-
-bool WriteStopMark(const QString& folder, const QString& value)
-{
-    return WriteInfoFile(folder + QStringLiteral("/DirInfo.bvxinf"), {{QStringLiteral("StopDir"), value}});
-}
 
 QString CatalogueFixture(const QString& name)
 {
@@ -31,4 +18,10 @@ bool CopyFixture(const QString& fixture, const QString& path)
     QDir().mkpath(QFileInfo(path).absolutePath());
     QFile::remove(path);
     return QFileInfo::exists(fixture) && QFile::copy(fixture, path);
+}
+
+QByteArray ValidIconFile()
+{
+    Brimvault::cFileIcon icon;
+    return icon.LoadMainIconFromEXE(PeFixture(QStringLiteral("multi64.exe"))) ? icon.toIconFile() : QByteArray();
 }
