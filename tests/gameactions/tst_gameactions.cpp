@@ -82,7 +82,7 @@ private Q_SLOTS:
         QTest::newRow("aspx") << u"/g/x.aspx"_s << web << QString();
         QTest::newRow("mht") << u"/g/saved.mht"_s << web << QString();
         QTest::newRow("php") << u"/g/game.php"_s << web << QString();
-        QTest::newRow("asp query, any case") << u"/g/Page.ASP?id=1"_s << web << QString();
+        QTest::newRow("asp query, any case") << u"/g/start?Page.ASP?id=1"_s << web << QString();
         QTest::newRow("address") << u" HTTPS://127.0.0.1:9/games"_s << web << QString();
         QTest::newRow("ht") << u"/g/x.ht"_s << process << QString();
         QTest::newRow("exe") << u"/g/sol.exe"_s << process << QString();
