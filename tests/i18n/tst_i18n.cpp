@@ -94,6 +94,9 @@ private Q_SLOTS:
                                       << u"Ελλά"_s;
         QTest::newRow("utf-8 wins") << "\xEF\xBB\xBF" + file("@10=" + u"Łódź"_s.toUtf8()) << u"Łódź"_s;
         QTest::newRow("broken utf-8 tail") << QByteArray("#language=Test\r\n#charset=204\r\n@10=abc\xD0") << u"abcР"_s;
+        QTest::newRow("last setting wins")
+            << QByteArray("#language=A\r\n#charset=204\r\n#language=Test") << u"default"_s;
+        QTest::newRow("negative charset") << QByteArray("#language=Test\r\n#charset=-3") << u"default"_s;
         QTest::newRow("repeated key, blanks around") << file("@10=A\r\n@ 10 =B") << refused;
         QTest::newRow("repeated key, letter case") << file("@7a=A\r\n@7A=B") << refused;
         QTest::newRow("no charset") << QByteArray("#language=Test\r\n@10=A\r\n") << refused;
