@@ -298,6 +298,16 @@ private Q_SLOTS:
         QLocale::setDefault(QLocale::system());
     }
 
+    // A window takes its captions when a language file is in force, or when forced.
+    void applyLanguage()
+    {
+        CaptionedWindow window;
+        QVERIFY(!ApplyLanguage(&window, false) && window.text().isEmpty());
+        LoadLanguageFile(WriteLanguageFile(m_env->programDir(), u"Ru.lng"_s, "Russian", 204, "@10=Rus\r\n"));
+        QVERIFY(ApplyLanguage(&window, false));
+        QCOMPARE(window.text(), u"Rus"_s);
+    }
+
     // Every window, shown or not, even when one closes another while taking its captions; windows without
     // captions of their own are passed over.
     void switchLanguageReCaptionsEveryWindow()
