@@ -18,7 +18,8 @@ const QString Usage = u"Usage: brimvault [OPTION [ARGUMENTS]]\n"
                       "  --version                    show the program's version\n"
                       "  --extract-icon FILE OUT.ico  write the main icon of an executable as an icon file\n"
                       "  --version-info FILE          print the version information of an executable\n"
-                      "  --list [--json]              print the games as the window lists them, without writing "
+                      "  --list [--json] [--find TEXT] [--order found|name|recent]\n"
+                      "                               print the games as the window lists them, without writing "
                       "anything\n"_s;
 
 } // namespace

@@ -12,6 +12,7 @@
 #include "ui/main/frmMain.h"
 
 #include <QApplication>
+#include <QPointer>
 #include <QtTest>
 
 #include <sys/stat.h>
@@ -65,7 +66,15 @@ QByteArray stampOf(const QString& path)
 class TestStartup : public QObject {
     Q_OBJECT
 private Q_SLOTS:
-    void cleanup() { qDeleteAll(QApplication::topLevelWidgets()); }
+    // A window takes its menus with it: each top-level widget is deleted once, if it is still there.
+    void cleanup()
+    {
+        QList<QPointer<QWidget>> windows;
+        for (QWidget* widget : QApplication::topLevelWidgets())
+            windows << widget;
+        for (const QPointer<QWidget>& window : windows)
+            delete window.data();
+    }
 
     void firstRunRegistersAllAndShowsWindow()
     {

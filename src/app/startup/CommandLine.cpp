@@ -30,14 +30,24 @@ QString Usage()
 {
     QString text = QStringLiteral("Usage: brimvault [OPTION [ARGUMENTS]]\n"
                                   "Without an option the program starts its window.\n\n");
+    // Descriptions line up after the short synopses; a longer synopsis has its description on the next line.
+    constexpr qsizetype longestInline = 30;
     const QList<Command> commands = Commands();
+    const auto synopsisOf = [](const Command& command) -> QString {
+        return command.argumentsHelp.isEmpty() ? command.option : command.option + u' ' + command.argumentsHelp;
+    };
     qsizetype width = 0;
-    for (const Command& command : commands)
-        width = std::max(width, command.option.size() + 1 + command.argumentsHelp.size());
     for (const Command& command : commands) {
-        const QString synopsis
-            = command.argumentsHelp.isEmpty() ? command.option : command.option + u' ' + command.argumentsHelp;
-        text += QStringLiteral("  ") + synopsis.leftJustified(width + 2) + command.description + u'\n';
+        if (const qsizetype size = synopsisOf(command).size(); size <= longestInline)
+            width = std::max(width, size);
+    }
+    for (const Command& command : commands) {
+        const QString synopsis = synopsisOf(command);
+        if (synopsis.size() <= longestInline)
+            text += QStringLiteral("  ") + synopsis.leftJustified(width + 2);
+        else
+            text += QStringLiteral("  ") + synopsis + u'\n' + QString(width + 4, u' ');
+        text += command.description + u'\n';
     }
     return text;
 }

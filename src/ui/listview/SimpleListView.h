@@ -11,6 +11,7 @@
 
 #include <functional>
 
+class QHelpEvent;
 class QMimeData;
 class QPainter;
 class QScrollBar;
@@ -165,7 +166,8 @@ private:
     void notifyAccessibleFocus();
     void setKeyboardCues(bool shown);
     void paintFocusMark(QPainter& painter) const;
-    // Narrowing
+    // Narrowing and tooltips
+    bool showItemToolTip(QHelpEvent* help);
     // Moves the selection off an item the narrowing left out: to the next shown item, else the one before.
     void selectShownNear(int index);
     // After a rename: the current item leaves when it no longer passes the test.

@@ -5,6 +5,7 @@
 
 #include <QAccessible>
 #include <QFocusEvent>
+#include <QHelpEvent>
 #include <QPainter>
 
 namespace Brimvault {
@@ -87,6 +88,8 @@ bool SimpleListView::event(QEvent* event)
     case QEvent::MouseButtonDblClick:
         setKeyboardCues(false);
         break;
+    case QEvent::ToolTip:
+        return showItemToolTip(static_cast<QHelpEvent*>(event));
     default:
         break;
     }

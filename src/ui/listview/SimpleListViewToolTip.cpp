@@ -10,16 +10,13 @@ void SimpleListView::setToolTipSource(std::function<QString(int index)> source)
     m_toolTipSource = std::move(source);
 }
 
-bool SimpleListView::event(QEvent* event)
+bool SimpleListView::showItemToolTip(QHelpEvent* help)
 {
-    if (event->type() != QEvent::ToolTip)
-        return QWidget::event(event);
-    auto* help = static_cast<QHelpEvent*>(event);
     const Hit hit = hitTest(help->pos());
     const QString text = hit.index >= 0 && m_toolTipSource ? m_toolTipSource(hit.index) : QString();
     if (text.isEmpty()) {
         QToolTip::hideText();
-        event->ignore();
+        help->ignore();
     } else {
         QToolTip::showText(help->globalPos(), text, this);
     }

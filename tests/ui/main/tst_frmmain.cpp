@@ -182,9 +182,9 @@ private Q_SLOTS:
         };
         const QStringList english {u"Brimvault"_s, u"Actions"_s, u"Actions"_s, u"Brimvault"_s, u"Brimvault"_s,
             u"Copyright © Brimvault Games. All rights reserved."_s, u"Add game file..."_s,
-            u"Add games from folder..."_s, u"Install game..."_s, u"Get more games..."_s, u"Remove game..."_s,
-            u"Remove all added games..."_s, u"Language..."_s, u"Help..."_s, u"About..."_s, u"Open game offline"_s,
-            u"Rename game"_s, u"Remove game..."_s};
+            u"Add games from folder..."_s, u"Install game..."_s, u"Order"_s, u"Get more games..."_s,
+            u"Remove game..."_s, u"Remove all added games..."_s, u"Language..."_s, u"Help..."_s, u"About..."_s,
+            u"Open game offline"_s, u"Rename game"_s, u"Remove game..."_s};
         QCOMPARE(captions(), english);
         QSignalSpy rebuilt(window.get(), &frmMain::listRebuilt);
         QCOMPARE(chooseLanguage(window.get(), 2),
