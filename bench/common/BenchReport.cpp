@@ -1,6 +1,7 @@
 #include "BenchReport.h"
 
 #include <QElapsedTimer>
+#include <QFile>
 #include <QTextStream>
 
 #include <algorithm>
@@ -45,6 +46,18 @@ double medianMilliseconds(int runs, const std::function<void()>& work)
         times.push_back(double(timer.nsecsElapsed()) / 1e6);
     }
     return median(times);
+}
+
+double residentMegabytes()
+{
+    QFile status(QStringLiteral("/proc/self/status"));
+    if (!status.open(QIODevice::ReadOnly))
+        return -1;
+    for (const QByteArray& line : status.readAll().split('\n')) {
+        if (line.startsWith("VmRSS:"))
+            return line.mid(6).trimmed().split(' ').value(0).toDouble() / 1024.0;
+    }
+    return -1;
 }
 
 } // namespace Brimvault::BenchReport

@@ -18,4 +18,7 @@ void ratio(const char* name, double ours, double reference);
 double median(std::vector<double> values);
 double medianMilliseconds(int runs, const std::function<void()>& work);
 
+// This process's resident memory in megabytes; -1 where it cannot be read.
+double residentMegabytes();
+
 } // namespace Brimvault::BenchReport

@@ -158,18 +158,6 @@ void measureList(int count)
     ratio(QStringLiteral("reorder_%1").arg(count), median(ourOrder), median(referenceOrder));
 }
 
-double residentMegabytes()
-{
-    QFile status(QStringLiteral("/proc/self/status"));
-    if (!status.open(QIODevice::ReadOnly))
-        return -1;
-    for (const QByteArray& line : status.readAll().split('\n')) {
-        if (line.startsWith("VmRSS:"))
-            return line.mid(6).trimmed().split(' ').value(0).toDouble() / 1024.0;
-    }
-    return -1;
-}
-
 // The window over a generated library: 29,000 installed games and 1,000 added by hand.
 bool measureWindow()
 {

@@ -35,18 +35,6 @@ namespace {
 constexpr int AddedByHand = 1000;
 constexpr int FillRuns = 3;
 
-double residentMegabytes()
-{
-    QFile status(QStringLiteral("/proc/self/status"));
-    if (!status.open(QIODevice::ReadOnly))
-        return -1;
-    for (const QByteArray& line : status.readAll().split('\n')) {
-        if (line.startsWith("VmRSS:"))
-            return line.mid(6).trimmed().split(' ').value(0).toDouble() / 1024.0;
-    }
-    return -1;
-}
-
 // Milliseconds from construction until discovery has filled the list and no icon waits; -1 when it did not
 // get there within a minute.
 double fillWindow(int installed, double* rssMegabytes)
