@@ -58,7 +58,9 @@ bool ListFinder::isOpen() const
 
 void ListFinder::caption()
 {
+    // A screen reader announces the field by the same words a sighted user sees in it.
     m_field->setPlaceholderText(modLocalizer::Translate(1300));
+    m_field->setAccessibleName(m_field->placeholderText());
 }
 
 void ListFinder::open(const QString& typed)

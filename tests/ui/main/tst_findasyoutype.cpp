@@ -131,6 +131,12 @@ private Q_SLOTS:
 
         QTest::keyClick(m_window.get(), Qt::Key_F, Qt::ControlModifier);
         QVERIFY(field()->isVisible() && field()->hasFocus());
+        // Tab moves between the field and the list; a screen reader names the field.
+        QCOMPARE(field()->accessibleName(), u"Find a game"_s);
+        QTest::keyClick(field(), Qt::Key_Tab);
+        QCOMPARE(QApplication::focusWidget(), list());
+        QTest::keyClick(list(), Qt::Key_Backtab, Qt::ShiftModifier);
+        QCOMPARE(QApplication::focusWidget(), field());
     }
 
     void changesWhileNarrowedKeepTheNarrowing()
