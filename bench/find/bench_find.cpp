@@ -5,6 +5,7 @@
 // Arguments: library sizes for the list figures (default 1000 10000 30000); "--no-window" skips the window.
 #include "BenchLibrary.h"
 #include "BenchReport.h"
+#include "WindowFill.h"
 #include "catalogue/ListOrder.h"
 #include "ui/listview/SimpleListView.h"
 #include "ui/main/ListFinder.h"
@@ -170,16 +171,9 @@ bool measureWindow()
         QTextStream(stderr) << "could not build the library of 30000 games\n";
         return false;
     }
-    QElapsedTimer timer;
-    timer.start();
-    auto window = std::make_unique<frmMain>();
     bool rebuilt = false;
-    QObject::connect(window.get(), &frmMain::listRebuilt, window.get(), [&rebuilt] { rebuilt = true; });
-    window->show();
-    while (!(rebuilt && window->pendingIcons() == 0) && timer.elapsed() < 120000)
-        QCoreApplication::processEvents(QEventLoop::WaitForMoreEvents | QEventLoop::AllEvents, 50);
-    window->ListView1()->repaint();
-    const double fill = double(timer.nsecsElapsed()) / 1e6;
+    double fill = 0;
+    const std::unique_ptr<frmMain> window = OpenFilledWindow(120000, &rebuilt, &fill);
     if (!rebuilt || window->ListView1()->layoutState().itemCount < 30000) {
         QTextStream(stderr) << "window listed " << window->ListView1()->layoutState().itemCount << " games\n";
         return false;

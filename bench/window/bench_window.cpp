@@ -4,6 +4,7 @@
 // Set BRIMVAULT_BENCH_LIBRARIES to a folder to make the libraries once and measure them again in later runs.
 #include "BenchLibrary.h"
 #include "BenchReport.h"
+#include "WindowFill.h"
 #include "catalogue/IconCacheKey.h"
 #include "icons/cFileIcon.h"
 #include "store/DataFolders.h"
@@ -39,15 +40,9 @@ constexpr int FillRuns = 3;
 // get there within a minute.
 double fillWindow(int installed, double* rssMegabytes)
 {
-    QElapsedTimer timer;
-    timer.start();
-    auto window = std::make_unique<frmMain>();
     bool rebuilt = false;
-    QObject::connect(window.get(), &frmMain::listRebuilt, window.get(), [&rebuilt] { rebuilt = true; });
-    window->show();
-    while (!(rebuilt && window->pendingIcons() == 0) && timer.elapsed() < 60000)
-        QCoreApplication::processEvents(QEventLoop::WaitForMoreEvents | QEventLoop::AllEvents, 50);
-    const double elapsed = double(timer.nsecsElapsed()) / 1e6;
+    double elapsed = 0;
+    std::unique_ptr<frmMain> window = OpenFilledWindow(60000, &rebuilt, &elapsed);
     // The list also holds the entry for more games on line; count only the generated ones.
     int items = 0;
     for (int i = 0; i < window->ListView1()->layoutState().itemCount; ++i)

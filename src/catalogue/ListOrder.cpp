@@ -50,6 +50,11 @@ void Store(ListOrder order)
 
 void Sort(QList<GameEntry>& entries, ListOrder order, const QHash<QString, PlayRecord>& history)
 {
+    if (order == ListOrder::AsFound)
+        return;
+    QList<qsizetype> indices(entries.size());
+    std::iota(indices.begin(), indices.end(), 0);
+    // Stable sorts: equals keep the found order.
     if (order == ListOrder::ByName) {
         // The C locale compares code points; such a system sorts as English does.
         const QLocale locale = QLocale().language() == QLocale::C ? QLocale(QLocale::English) : QLocale();
@@ -57,39 +62,29 @@ void Sort(QList<GameEntry>& entries, ListOrder order, const QHash<QString, PlayR
         collator.setCaseSensitivity(Qt::CaseInsensitive);
         collator.setNumericMode(true);
         // Blanks that list building put into long names must not change their place.
-        QList<std::pair<QCollatorSortKey, qsizetype>> keys;
+        QList<QCollatorSortKey> keys;
         keys.reserve(entries.size());
-        for (qsizetype i = 0; i < entries.size(); ++i)
-            keys.append({collator.sortKey(entries.at(i).caption.simplified()), i});
-        std::stable_sort(
-            keys.begin(), keys.end(), [](const auto& a, const auto& b) { return a.first.compare(b.first) < 0; });
-        QList<GameEntry> sorted;
-        sorted.reserve(entries.size());
-        for (const auto& key : keys)
-            sorted.append(std::move(entries[key.second]));
-        entries = std::move(sorted);
-        return;
-    }
-    if (order == ListOrder::RecentlyPlayed) {
+        for (const GameEntry& entry : std::as_const(entries))
+            keys.append(collator.sortKey(entry.caption.simplified()));
+        std::stable_sort(indices.begin(), indices.end(),
+            [&keys](qsizetype a, qsizetype b) { return keys.at(a).compare(keys.at(b)) < 0; });
+    } else {
         QList<QDateTime> played;
         played.reserve(entries.size());
-        for (const GameEntry& entry : entries)
+        for (const GameEntry& entry : std::as_const(entries))
             played.append(history.value(PlayHistory::KeyFor(entry.path)).lastPlayed);
-        QList<qsizetype> indices(entries.size());
-        std::iota(indices.begin(), indices.end(), 0);
+        // Last played first; the games never played after them.
         std::stable_sort(indices.begin(), indices.end(), [&played](qsizetype a, qsizetype b) {
             const QDateTime& x = played.at(a);
             const QDateTime& y = played.at(b);
-            if (x.isValid() != y.isValid())
-                return x.isValid();
-            return x.isValid() && x > y;
+            return x.isValid() && (!y.isValid() || x > y);
         });
-        QList<GameEntry> sorted;
-        sorted.reserve(entries.size());
-        for (qsizetype i : indices)
-            sorted.append(std::move(entries[i]));
-        entries = std::move(sorted);
     }
+    QList<GameEntry> sorted;
+    sorted.reserve(entries.size());
+    for (qsizetype i : std::as_const(indices))
+        sorted.append(std::move(entries[i]));
+    entries = std::move(sorted);
 }
 
 } // namespace Brimvault::ListOrders

@@ -7,6 +7,7 @@
 #include "store/CatalogueKeys.h"
 #include "store/CatalogueStore.h"
 #include "store/DataFolders.h"
+#include "store/PlayHistory.h"
 #include "store/SettingsStore.h"
 #include "support/UserPrompt.h"
 
@@ -60,6 +61,7 @@ RemovalOutcome AskAndRemoveGame(const QString& caption, const QString& data)
         return RemovalOutcome::Failed;
     }
     forgetAddedEntries(data.toUpper().trimmed());
+    PlayHistory::Forget(data);
     return RemovalOutcome::Removed;
 }
 
@@ -69,7 +71,12 @@ bool AskAndRemoveAllAddedGames()
                                  .replace(QStringLiteral("..."), QStringLiteral("?      "));
     if (!askYesNo(question))
         return false;
-    return DeleteSection(AppTitle(), CatalogueKeys::FilesSection);
+    const QList<CatalogueStore::AddedGame> games = CatalogueStore::AddedGames();
+    if (!DeleteSection(AppTitle(), CatalogueKeys::FilesSection))
+        return false;
+    for (const CatalogueStore::AddedGame& game : games)
+        PlayHistory::Forget(game.path);
+    return true;
 }
 
 } // namespace Brimvault

@@ -7,6 +7,7 @@
 
 class QImage;
 class QPainter;
+class QScreen;
 
 namespace Brimvault {
 
@@ -87,6 +88,10 @@ private:
     void reset(const QString& sFileName);
     bool loadGroup(const PeModule& module, int lID, const QString& sName);
     void checkIndex(int nIndex) const;
+    // Bits per pixel of an image, from its colour count (32 for true colour).
+    double imageDepth(int nIndex) const;
+    // The screen icons are drawn for; none without a GUI application.
+    static const QScreen* displayScreen();
 
     QString m_filename;
     QVariant m_resourceId;

@@ -32,14 +32,24 @@ QPainter::CompositionMode compositionFor(quint32 rop)
 
 } // namespace
 
+const QScreen* cFileIcon::displayScreen()
+{
+    return qobject_cast<QGuiApplication*>(QCoreApplication::instance()) ? QGuiApplication::primaryScreen() : nullptr;
+}
+
 int cFileIcon::displayDepth()
 {
     if (m_displayDepth == 0) {
-        const QScreen* screen
-            = qobject_cast<QGuiApplication*>(QCoreApplication::instance()) ? QGuiApplication::primaryScreen() : nullptr;
+        const QScreen* screen = displayScreen();
         m_displayDepth = screen && screen->depth() > 0 ? screen->depth() : 32;
     }
     return m_displayDepth;
+}
+
+double cFileIcon::imageDepth(int nIndex) const
+{
+    const qint64 colours = ImageColourCount(nIndex);
+    return colours == -1 ? 32.0 : std::round(std::log2(double(colours)));
 }
 
 int cFileIcon::bestIconIndex(int wantedDepth) const
@@ -48,8 +58,7 @@ int cFileIcon::bestIconIndex(int wantedDepth) const
     int widthDistance = 256;
     double depthDistance = 32;
     for (int i = 1; i <= qMin<int>(ImageCount(), int(m_entries.size())); ++i) {
-        const qint64 colours = ImageColourCount(i);
-        const double depth = colours == -1 ? 32.0 : std::round(std::log2(double(colours)));
+        const double depth = imageDepth(i);
         if (ImageWidth(i) == WantedWidth) {
             if (depth == wantedDepth)
                 return i;

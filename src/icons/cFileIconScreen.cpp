@@ -2,7 +2,6 @@
 // real pixels, so a 64- or 256-pixel image is not blurred up from the 32-pixel one.
 #include "icons/cFileIcon.h"
 
-#include <QGuiApplication>
 #include <QImage>
 #include <QScreen>
 
@@ -18,8 +17,7 @@ constexpr int CellPixels = 32;
 
 qreal cFileIcon::displayPixelRatio()
 {
-    const QScreen* screen
-        = qobject_cast<QGuiApplication*>(QCoreApplication::instance()) ? QGuiApplication::primaryScreen() : nullptr;
+    const QScreen* screen = displayScreen();
     return screen ? screen->devicePixelRatio() : 1.0;
 }
 
@@ -28,10 +26,6 @@ int cFileIcon::sharpIconIndex(int wantedPixels, int wantedDepth) const
     // The smallest image that covers the wanted pixels, else the largest; among equals the deepest up to the
     // display's depth.
     int best = 0;
-    auto depthOf = [this](int i) {
-        const qint64 colours = ImageColourCount(i);
-        return colours == -1 ? 32.0 : std::round(std::log2(double(colours)));
-    };
     // A width byte of 0 stands for 256 pixels.
     auto widthOf = [this](int i) { return ImageWidth(i) == 0 ? 256 : ImageWidth(i); };
     auto better = [&](int i) {
@@ -41,7 +35,7 @@ int cFileIcon::sharpIconIndex(int wantedPixels, int wantedDepth) const
             return covers;
         if (width != bestWidth)
             return covers ? width < bestWidth : width > bestWidth;
-        return std::abs(depthOf(i) - wantedDepth) < std::abs(depthOf(best) - wantedDepth);
+        return std::abs(imageDepth(i) - wantedDepth) < std::abs(imageDepth(best) - wantedDepth);
     };
     for (int i = 1; i <= qMin<int>(ImageCount(), int(m_entries.size())); ++i) {
         if (best == 0 || better(i))

@@ -61,7 +61,7 @@ QHash<QString, PlayRecord> ReadAll()
     const QList<QPair<QString, QString>> pairs = GetAllSettings(AppTitle(), Section);
     for (const auto& [key, value] : pairs) {
         if (const std::optional<PlayRecord> record = ParseRecord(value))
-            records.insert(key.trimmed().toLower(), *record);
+            records.insert(KeyFor(key), *record);
     }
     return records;
 }

@@ -97,6 +97,7 @@ bool SimpleListView::addItem(const QPixmap* picture, const QString& caption, con
         m_bands.invalidate();
     }
     ++m_state.itemCount;
+    ++m_shownRevision;
     updateItem(index);
     // The first game a narrowing shows after it showed none becomes the current one.
     if (m_narrowing && !item.narrowedOut && !isItemShown(m_frame.currentIndex()))
@@ -128,6 +129,7 @@ ListError SimpleListView::RemoveCurrentItem()
     }
     if (m_state.itemCount > 0)
         --m_state.itemCount;
+    ++m_shownRevision;
     selectShownNear(m_frame.currentIndex());
     arrangeItems();
     update();
@@ -155,6 +157,7 @@ void SimpleListView::clearItems()
     first.narrowedOut = false;
     m_model.unloadAllButFirst();
     m_bands.invalidate();
+    ++m_shownRevision;
 }
 
 void SimpleListView::InitSelection()

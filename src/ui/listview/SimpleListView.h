@@ -70,8 +70,9 @@ public:
     QScrollBar* vbarWindow() const { return m_vbar; }
     QTimer* Timer1() const { return m_timer; }
 
-    // Assistive technology and the keyboard. An item is shown unless a filter hides it; a filter calls
-    // shownItemsChanged() after changing what is shown, so that readers list the items again.
+    // Assistive technology and the keyboard. An item is shown unless the narrowing hides it; a change of
+    // narrowing calls shownItemsChanged(), so that readers list the items again. The revision moves with every
+    // change of the shown items (adding and removing too).
     void shownItemsChanged();
     quint64 shownRevision() const { return m_shownRevision; }
     // The selected item, or -1 when none is selected or it is not shown.

@@ -32,8 +32,7 @@ const std::vector<int>& SimpleListViewAccessible::shownItems() const
 {
     // A reader walks every child in turn: the shown items are listed once per change, not once per question.
     const SimpleListView* view = list();
-    const quint64 key
-        = (view->shownRevision() << 40) ^ (quint64(view->layoutState().itemCount) << 20) ^ quint64(view->loadedCount());
+    const quint64 key = view->shownRevision();
     if (key != m_shownKey) {
         m_shown.clear();
         for (int i = 0; i < view->layoutState().itemCount; ++i) {

@@ -64,8 +64,9 @@ bool SimpleListView::showsFocusMark() const
 
 void SimpleListView::notifyAccessibleFocus()
 {
+    // Nothing to tell while no reader listens: the interface is not even made.
     const int current = currentItem();
-    if (!hasFocus() || current < 0)
+    if (!QAccessible::isActive() || !hasFocus() || current < 0)
         return;
     auto* accessible = static_cast<SimpleListViewAccessible*>(QAccessible::queryAccessibleInterface(this));
     const int child = accessible ? accessible->childOfItem(current) : -1;

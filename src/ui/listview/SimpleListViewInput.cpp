@@ -38,7 +38,7 @@ ListError SimpleListView::selectItem(int index)
     m_frame.rect = frame.translated(-m_state.horizontalOffset, -m_state.scrollOffsetY);
 
     const int old = m_frame.currentIndex();
-    const bool moved = m_frame.tag != QString::number(index);
+    const bool moved = m_frame.tag.isEmpty() || old != index;
     if (m_model.isLoaded(old)) {
         m_model.at(old).face.setBackColor(m_backColor.rgb());
         m_model.at(old).captionColor = ListGrid::CaptionColor;

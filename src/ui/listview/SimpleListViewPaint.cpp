@@ -13,9 +13,7 @@ void SimpleListView::paintEvent(QPaintEvent* event)
     painter.fillRect(dirty, m_backColor);
     painter.setFont(m_wrapper.font());
 
-    const int current = m_model.isLoaded(m_frame.currentIndex()) && !m_model.at(m_frame.currentIndex()).narrowedOut
-        ? m_frame.currentIndex()
-        : -1;
+    const int current = isItemShown(m_frame.currentIndex()) ? m_frame.currentIndex() : -1;
     const QRectF area(dirty);
     auto drawCaption = [&](const ListItem& item) {
         const QRectF box = shownCaptionRect(item);

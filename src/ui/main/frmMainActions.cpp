@@ -11,9 +11,6 @@
 #include "gameactions/ItemMenuDelay.h"
 #include "gameactions/PackageInstallCommand.h"
 #include "gameactions/ServiceSignal.h"
-#include "store/CatalogueKeys.h"
-#include "store/PlayHistory.h"
-#include "store/SettingsStore.h"
 #include "ui/listview/SimpleListView.h"
 #include "ui/main/QuilletCalls.h"
 
@@ -101,18 +98,12 @@ void frmMain::mnuRemoveFileClick()
     if (m_listView->RemoveCurrentItem())
         m_listView->RemoveAll();
     m_builder->ForgetGame(itemData);
-    PlayHistory::Forget(itemData);
 }
 
 void frmMain::mnuRemoveAllFilesClick()
 {
-    const QList<QPair<QString, QString>> added = GetAllSettings(AppTitle(), CatalogueKeys::FilesSection);
     if (!AskAndRemoveAllAddedGames())
         return;
-    for (const auto& [key, path] : added) {
-        if (key.trimmed().compare(CatalogueKeys::CountKey, Qt::CaseInsensitive) != 0)
-            PlayHistory::Forget(path);
-    }
     m_listView->RemoveAll();
     RebuildList();
 }
