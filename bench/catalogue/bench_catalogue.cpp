@@ -1,8 +1,10 @@
-// Discovery on generated libraries of 1,000 and 10,000 installed games (each in its own folder with a real
+// Discovery on generated libraries of 1,000, 10,000 and 30,000 installed games (each in its own folder with a real
 // executable, an info file and a cached icon) plus 1,000 games added by hand. The folder walk is measured
-// beside `find` over the same tree; the listing command from process start to exit.
+// beside `find` over the same tree; the listing command from process start to exit, beside
+// the least reading any program must do for that library.
 #include "BenchLibrary.h"
 #include "BenchReport.h"
+#include "ReadFloor.h"
 #include "catalogue/CatalogueListing.h"
 #include "catalogue/CatalogueLocations.h"
 #include "catalogue/GameDiscovery.h"
@@ -51,9 +53,11 @@ qsizetype runListCommand()
 
 void measure(int installed, const QByteArray& exe, const QByteArray& icon)
 {
-    QTemporaryDir root;
-    if (reusableLibrary(installed, AddedByHand, exe, icon).isEmpty()
-        && !makeLibrary(root.path(), installed, AddedByHand, exe, icon)) {
+    QTemporaryDir temporary;
+    QString root = reusableLibrary(installed, AddedByHand, exe, icon);
+    if (root.isEmpty() && makeLibrary(temporary.path(), installed, AddedByHand, exe, icon))
+        root = temporary.path();
+    if (root.isEmpty()) {
         QTextStream(stderr) << "could not build the library of " << installed << " games\n";
         return;
     }
@@ -88,6 +92,9 @@ void measure(int installed, const QByteArray& exe, const QByteArray& icon)
     if (lines != items)
         QTextStream(stderr) << "--list printed " << lines << " lines, discovery gave " << items << '\n';
     figure(QStringLiteral("list_command_") + suffix, listing, "ms");
+    const double floor = ReadFloor::milliseconds(root + QStringLiteral("/added"), 5);
+    figure(QStringLiteral("read_floor_") + suffix, floor, "ms");
+    ratio(QStringLiteral("list_command_vs_floor_") + suffix, listing, floor);
 }
 
 } // namespace

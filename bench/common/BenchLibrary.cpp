@@ -56,7 +56,7 @@ QList<int> librarySizes(const QStringList& arguments)
     for (const QString& argument : arguments)
         sizes.append(argument.toInt());
     if (sizes.isEmpty())
-        sizes = {1000, 10000};
+        sizes = {1000, 10000, 30000};
     return sizes;
 }
 

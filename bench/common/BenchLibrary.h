@@ -24,7 +24,7 @@ struct GameFiles {
 };
 std::optional<GameFiles> loadGameFiles(const QString& peFixture);
 
-// Library sizes given on the command line (for profiling one of them), else 1,000 and 10,000.
+// Library sizes given on the command line (for profiling one of them), else 1,000, 10,000 and 30,000.
 QList<int> librarySizes(const QStringList& arguments);
 
 bool makeLibrary(const QString& root, int installed, int addedByHand, const QByteArray& exe, const QByteArray& icon);

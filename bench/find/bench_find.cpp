@@ -171,14 +171,13 @@ bool measureWindow()
         QTextStream(stderr) << "could not build the library of 30000 games\n";
         return false;
     }
-    bool rebuilt = false;
-    double fill = 0;
-    const std::unique_ptr<frmMain> window = OpenFilledWindow(120000, &rebuilt, &fill);
-    if (!rebuilt || window->ListView1()->layoutState().itemCount < 30000) {
+    FillTimes times;
+    const std::unique_ptr<frmMain> window = OpenFilledWindow(120000, &times);
+    if (!times.filled || window->ListView1()->layoutState().itemCount < 30000) {
         QTextStream(stderr) << "window listed " << window->ListView1()->layoutState().itemCount << " games\n";
         return false;
     }
-    figure("window_fill_30000", fill, "ms");
+    figure("window_fill_30000", times.fill, "ms");
     figure("window_rss_30000", residentMegabytes(), "MB");
 
     // Three letters typed into the filled window, as the user does.

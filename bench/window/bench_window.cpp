@@ -1,9 +1,12 @@
-// The main window over generated libraries of 1,000 and 10,000 installed games (each in its own folder with
-// a real executable, an info file and a cached icon): from construction to the list filled with every icon
-// shown (the median of three windows), and the process's resident memory with the larger library on screen.
+// The main window over generated libraries of 1,000, 10,000 and 30,000 installed games (each in its own folder
+// with a real executable, an info file and a cached icon) and 1,000 added by hand: from construction to the
+// list filled with every icon shown and to the first screen painted (the median of three windows), beside
+// the least reading any program must do for that library; the longest the event loop waited during a fill;
+// the process's resident memory with the library on screen.
 // Set BRIMVAULT_BENCH_LIBRARIES to a folder to make the libraries once and measure them again in later runs.
 #include "BenchLibrary.h"
 #include "BenchReport.h"
+#include "ReadFloor.h"
 #include "WindowFill.h"
 #include "catalogue/IconCacheKey.h"
 #include "icons/cFileIcon.h"
@@ -36,27 +39,25 @@ namespace {
 constexpr int AddedByHand = 1000;
 constexpr int FillRuns = 3;
 
-// Milliseconds from construction until discovery has filled the list and no icon waits; -1 when it did not
+// One window from construction until discovery has filled the list and no icon waits; nothing when it did not
 // get there within a minute.
-double fillWindow(int installed, double* rssMegabytes)
+std::optional<FillTimes> fillWindow(int installed, double* rssMegabytes)
 {
-    bool rebuilt = false;
-    double elapsed = 0;
-    std::unique_ptr<frmMain> window = OpenFilledWindow(60000, &rebuilt, &elapsed);
+    FillTimes times;
+    std::unique_ptr<frmMain> window = OpenFilledWindow(60000, &times);
     // The list also holds the entry for more games on line; count only the generated ones.
     int items = 0;
     for (int i = 0; i < window->ListView1()->layoutState().itemCount; ++i)
         items += window->ListView1()->labN(i).text().startsWith(QStringLiteral("Game game"));
-    if (!rebuilt || window->pendingIcons() != 0 || items != installed) {
+    if (!times.filled || items != installed) {
         QTextStream(stderr) << "window listed " << items << " of " << installed << " games, " << window->pendingIcons()
                             << " icons pending\n";
-        return -1;
+        return std::nullopt;
     }
-    if (rssMegabytes)
-        *rssMegabytes = residentMegabytes();
+    *rssMegabytes = residentMegabytes();
     window.reset();
     QCoreApplication::processEvents();
-    return elapsed;
+    return times;
 }
 
 } // namespace
@@ -79,23 +80,33 @@ int main(int argc, char** argv)
             return 1;
         }
         // The machines are shared: the median of a few fills, and the largest resident size seen.
-        std::vector<double> fills;
+        std::vector<double> fills, firstScreens, gaps;
         double rss = -1;
         for (int run = 0; run < FillRuns; ++run) {
             double runRss = -1;
-            const double fill = fillWindow(installed, &runRss);
-            if (fill < 0)
+            const std::optional<FillTimes> times = fillWindow(installed, &runRss);
+            if (!times)
                 break;
-            fills.push_back(fill);
+            fills.push_back(times->fill);
+            firstScreens.push_back(times->firstScreen);
+            gaps.push_back(times->longestGap);
             rss = qMax(rss, runRss);
         }
-        if (fills.size() != std::size_t(FillRuns)) {
+        const double floor
+            = ReadFloor::milliseconds((root.isEmpty() ? temporary.path() : root) + QStringLiteral("/added"), FillRuns);
+        if (fills.size() != std::size_t(FillRuns) || floor < 0) {
             ++failures;
             continue;
         }
-        figure(QStringLiteral("window_fill_%1").arg(installed), median(fills), "ms");
-        if (installed == 10000)
-            figure(QStringLiteral("window_rss_10000"), rss, "MB");
+        const QString suffix = QString::number(installed);
+        const double fill = median(fills);
+        figure(QStringLiteral("window_fill_") + suffix, fill, "ms");
+        figure(QStringLiteral("read_floor_") + suffix, floor, "ms");
+        ratio(QStringLiteral("window_fill_vs_floor_") + suffix, fill, floor);
+        figure(QStringLiteral("window_first_screen_") + suffix, median(firstScreens), "ms");
+        ratio(QStringLiteral("window_first_screen_vs_fill_") + suffix, median(firstScreens), fill);
+        figure(QStringLiteral("window_longest_event_gap_") + suffix, *std::max_element(gaps.begin(), gaps.end()), "ms");
+        figure(QStringLiteral("window_rss_") + suffix, rss, "MB");
     }
     return failures == 0 ? 0 : 1;
 }

@@ -181,7 +181,10 @@ void frmMain::showEvent(QShowEvent* event)
     if (m_loaded)
         return;
     m_loaded = true;
-    QTimer::singleShot(0, this, &frmMain::formLoad);
+    // From a timer rather than a queued call (which a zero delay becomes): the fill lets events run between
+    // items, and while it ran inside the dispatch of queued calls the list's own repaints, queued as well,
+    // waited for the whole fill, so the window showed nothing until the last game.
+    QTimer::singleShot(1, this, &frmMain::formLoad);
 }
 
 void frmMain::formLoad()
