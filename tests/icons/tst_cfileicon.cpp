@@ -165,10 +165,11 @@ private Q_SLOTS:
             u"8004041c Couldn't open file for writing. cFileIcon"_s);
         QCOMPARE(
             failure([&] { icon.SaveIcon(u"/dev/full"_s); }), u"8004041d General failure writing icon. cFileIcon"_s);
-        QCOMPARE(failure([&] { icon.AddImage(16, 16, 2); }), u"80040419 Icon already exists. cFileIcon"_s);
+        QVERIFY(icon.LoadIcon(written(BuildIconFile(ThreeImages))));
+        QCOMPARE(failure([&] { icon.AddImage(32, 32, 256); }), u"80040419 Icon already exists. cFileIcon"_s);
         QVERIFY_THROWS_EXCEPTION(NumberedError, icon.AddImage(-1, 16, 16));
         QVERIFY_THROWS_EXCEPTION(NumberedError, icon.AddImage(16, 16, 0x7FFFFFFF));
-        QCOMPARE(icon.ImageCount(), 1);
+        QCOMPARE(icon.toIconFile(), BuildIconFile(ThreeImages));
     }
 
     void edits_data()
