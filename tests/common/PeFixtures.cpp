@@ -74,44 +74,25 @@ std::optional<QJsonObject> PefileReading(const QString& exe)
 {
     const auto out = run(QStringLiteral("python3"),
         {QStringLiteral(BRIMVAULT_SOURCE_DIR "/tests/icons/pe_reference.py"), exe}, "python3-pefile");
-    if (!out)
-        return std::nullopt;
-    return QJsonDocument::fromJson(*out).object();
+    return out ? std::optional(QJsonDocument::fromJson(*out).object()) : std::nullopt;
 }
 
-QByteArray BuildIconFile(const QList<IconImage>& images)
+QByteArray BuildIconFile(const QList<IconImage>& images, quint16 type)
 {
-    QByteArray out(6, '\0');
-    qToLittleEndian<quint16>(1, out.data() + 2);
-    qToLittleEndian<quint16>(quint16(images.size()), out.data() + 4);
-    quint32 offset = 6 + 16 * quint32(images.size());
-    for (const IconImage& image : images) {
-        QByteArray entry(16, '\0');
-        entry[0] = char(image.width);
-        entry[1] = char(image.height);
-        entry[2] = char(image.colours);
-        qToLittleEndian<quint16>(image.planes, entry.data() + 4);
-        qToLittleEndian<quint16>(image.bitCount, entry.data() + 6);
-        qToLittleEndian<quint32>(quint32(image.bytes.size()), entry.data() + 8);
-        qToLittleEndian<quint32>(offset, entry.data() + 12);
-        offset += quint32(image.bytes.size());
-        out.append(entry);
+    QByteArray out = LittleEndian(quint16(0), type, quint16(images.size())), bitmaps;
+    const quint32 first = 6 + 16 * quint32(images.size());
+    for (const IconImage& i : images) {
+        out += LittleEndian(i.width, i.height, i.colours, quint8(0), i.planes, i.bitCount, quint32(i.bytes.size()),
+            first + quint32(bitmaps.size()));
+        bitmaps += i.bytes;
     }
-    for (const IconImage& image : images)
-        out.append(image.bytes);
-    return out;
+    return out + bitmaps;
 }
 
-QByteArray BlankBitmap(int width, int height, int bitCount, bool withMask)
+QByteArray BlankBitmap(int width, int height, int bitCount)
 {
-    const int paletteColours = bitCount <= 8 ? 1 << bitCount : 0;
-    const int colourRow = ((bitCount * width + 31) / 32) * 4;
-    const int maskRow = ((width + 31) / 32) * 4;
-    QByteArray out(40 + 4 * paletteColours + colourRow * height + (withMask ? maskRow * height : 0), '\0');
-    qToLittleEndian<quint32>(40, out.data());
-    qToLittleEndian<qint32>(width, out.data() + 4);
-    qToLittleEndian<qint32>(height * 2, out.data() + 8);
-    qToLittleEndian<quint16>(1, out.data() + 12);
-    qToLittleEndian<quint16>(quint16(bitCount), out.data() + 14);
-    return out;
+    const QByteArray header
+        = LittleEndian(quint32(40), qint32(width), qint32(height * 2), quint16(1), quint16(bitCount));
+    const int rows = ((bitCount * width + 31) / 32 + (width + 31) / 32) * 4 * height;
+    return header.leftJustified(40 + 4 * (bitCount <= 8 ? 1 << bitCount : 0) + rows, '\0');
 }

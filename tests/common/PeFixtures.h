@@ -1,9 +1,11 @@
 #pragma once
 
 #include <QByteArray>
+#include <QDataStream>
 #include <QJsonObject>
 #include <QList>
 #include <QString>
+#include <QtEndian>
 #include <optional>
 
 // Windows executables built here with mingw-w64 from tests/icons/fixtures (multi32.exe, multi64.exe, nores64.exe,
@@ -16,18 +18,34 @@ QString IconInput(const QString& name);
 // wrestool's extraction of one group icon as an icon file, cut to the bytes its directory covers.
 std::optional<QByteArray> WrestoolGroup(const QString& exe, const QString& group);
 // pefile's reading (tests/icons/pe_reference.py): {"resources": [[type, name, language, size, file offset], ...]
-// in stored order, "version": {"translation", "fields"} or null}, or {"error"} when pefile refuses the file.
+// in stored order or null}, or {"error"} when pefile refuses the file.
 std::optional<QJsonObject> PefileReading(const QString& exe);
 
-// An icon file assembled in memory, images packed back to back after the directory.
+// An icon file assembled in memory, images packed back to back after the directory; `type` 2 makes a cursor file.
 struct IconImage {
-    quint8 width;
-    quint8 height;
-    quint8 colours;
-    quint16 planes;
-    quint16 bitCount;
+    quint8 width, height, colours;
+    quint16 planes, bitCount;
     QByteArray bytes;
 };
-QByteArray BuildIconFile(const QList<IconImage>& images);
-// A bottom-up icon bitmap: 40-byte header, palette, colour bits and (optionally) the AND mask, all zero.
-QByteArray BlankBitmap(int width, int height, int bitCount, bool withMask = true);
+QByteArray BuildIconFile(const QList<IconImage>& images, quint16 type = 1);
+// A bottom-up icon bitmap: the 40-byte header, then palette, colour rows and mask rows, all zero.
+QByteArray BlankBitmap(int width, int height, int bitCount);
+
+// The values in little-endian order, as Windows files store them.
+template <typename... T>
+QByteArray LittleEndian(T... values)
+{
+    QByteArray out;
+    QDataStream stream(&out, QDataStream::WriteOnly);
+    stream.setByteOrder(QDataStream::LittleEndian);
+    (stream << ... << values);
+    return out;
+}
+
+// The bytes with a little-endian value written over them at `at`.
+template <typename T>
+QByteArray Patched(QByteArray bytes, qsizetype at, T value)
+{
+    qToLittleEndian<T>(value, bytes.data() + at);
+    return bytes;
+}

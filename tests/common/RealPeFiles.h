@@ -4,10 +4,9 @@
 
 namespace Brimvault {
 
-// Windows executables and libraries that Debian packages install on this machine (the mingw runtimes, Python
-// launchers, Wine), for tests and benchmarks that want PE files nobody here built. `firstFolders` and the
-// folders of BRIMVAULT_PE_CORPUS (colon-separated) are searched first. One file per distinct content, at most
-// maxFiles, sorted by path.
+// Windows executables and libraries installed on this machine (mingw runtimes, Python launchers, Wine): PE files
+// nobody here built. `firstFolders` and BRIMVAULT_PE_CORPUS (colon-separated) are searched first; one file per
+// distinct content, at most maxFiles, sorted by path.
 QStringList RealPeFiles(const QStringList& firstFolders, int maxFiles);
 
 } // namespace Brimvault

@@ -4,8 +4,6 @@
 #include "TestFiles.h"
 #include "TestSuite.h"
 
-#include <QTest>
-
 using namespace Brimvault;
 
 class tst_CommandLineResolve : public QObject {
@@ -38,8 +36,6 @@ private Q_SLOTS:
         QTest::addColumn<QString>("program");
         QTest::addColumn<QStringList>("arguments");
         const QString none;
-        QTest::newRow("program folder") << u"BrimvaultService -U"_qs << u"{root}/program/BrimvaultService"_qs
-                                        << QStringList {u"-U"_qs};
         QTest::newRow("exe name finds native companion")
             << u"BrimvaultService.exe -I \"{root}/a b.bvxpak\""_qs << u"{root}/program/BrimvaultService"_qs
             << QStringList {u"-I"_qs, u"{root}/a b.bvxpak"_qs};
@@ -72,24 +68,8 @@ private Q_SLOTS:
 
     void windowsExecutableWithoutRunner()
     {
-        QVERIFY(QFile::remove(m_env->path(u"bin/wine"_qs)));
-        qputenv("PATH", m_env->path(u"bin"_qs).toLocal8Bit());
-        QVERIFY(!ResolveCommandLine(m_env->path(u"games/game.exe"_qs)).has_value());
-    }
-
-    // It runs in the folder that was current, and the id is its own.
-    void startWithoutWaiting()
-    {
-        QVERIFY(!StartCommandLine(u"no-such-program-brimvault"_qs, 1).has_value());
-        const QString folder = m_env->path(u"my games"_qs);
-        const QString saved = QDir::currentPath();
-        QVERIFY(QDir::setCurrent(folder));
-        const auto pid = StartCommandLine(u"sh -c \"echo $$ $(pwd) > started\""_qs, 1);
-        QDir::setCurrent(saved);
-        QVERIFY(pid.has_value());
-        QTRY_VERIFY(ReadFile(folder + u"/started"_qs).endsWith('\n'));
-        QCOMPARE(
-            QString::fromLocal8Bit(ReadFile(folder + u"/started"_qs).trimmed()), QString::number(*pid) + u' ' + folder);
+        qputenv("PATH", m_env->path(u"program"_qs).toLocal8Bit());
+        QVERIFY(!ResolveCommandLine(m_env->path(u"games/game.exe"_qs)));
     }
 
 private:
