@@ -1,25 +1,47 @@
+// Finding the games of the computer, and adding games by hand, by folder and by drop.
 #include "catalogue/CatalogueLocations.h"
+#include "catalogue/GameAdder.h"
 #include "catalogue/GameDiscovery.h"
 #include "catalogue/ListBuilder.h"
 #include "i18n/modLocalizer.h"
 #include "store/SettingsStore.h"
 
+#include "CatalogueFiles.h"
+#include "PeFixtures.h"
 #include "TestEnvironment.h"
 #include "TestFiles.h"
 #include "TestSuite.h"
 
 using namespace Brimvault;
 using namespace Qt::StringLiterals;
+using Pairs = QList<QPair<QString, QString>>;
 
 class TestGameDiscovery : public QObject {
     Q_OBJECT
     std::unique_ptr<TestEnvironment> m_env;
+    std::unique_ptr<ListBuilder> m_builder;
+    std::unique_ptr<GameAdder> m_adder;
 
     QString path(const QString& relative) const { return m_env->path(relative); }
     QString games(const QString& relative) const { return path(u"commonappdata/Brimvault/"_s + relative); }
-    bool write(const QStringList& relatives) const
+    QString tree(const QString& name = QString()) const { return path(u"tree/"_s + name); }
+    bool write(const QString& folder, const QStringList& names) const
     {
-        return std::all_of(relatives.begin(), relatives.end(), [this](const QString& r) { return WriteFile(path(r)); });
+        return std::all_of(
+            names.begin(), names.end(), [&](const QString& name) { return WriteFile(path(folder + name)); });
+    }
+    static QStringList pathsOf(const QList<GameEntry>& entries)
+    {
+        QStringList paths;
+        for (const GameEntry& entry : entries)
+            paths.append(entry.path);
+        return paths;
+    }
+    static Pairs filesSection() { return GetAllSettings(AppTitle(), u"Files"_s); }
+    void start(const QByteArray& settings)
+    {
+        QVERIFY(WriteFile(m_env->settingsFile(), settings));
+        m_builder->beginPass();
     }
     struct Run {
         QStringList paths; // without the online entry
@@ -37,8 +59,7 @@ class TestGameDiscovery : public QObject {
         if (stopAt >= 0)
             hooks.stopRequested = [&run, stopAt] { return run.entries.size() >= stopAt; };
         run.result = GameDiscovery(builder, locations).Run(hooks);
-        for (const GameEntry& entry : run.entries.mid(1))
-            run.paths.append(entry.path);
+        run.paths = pathsOf(run.entries.mid(1));
         return run;
     }
 
@@ -49,21 +70,25 @@ private Q_SLOTS:
         m_env = std::make_unique<TestEnvironment>();
         m_env->programDir();
         qputenv("WINEPREFIX", path(u"wine"_s).toLocal8Bit());
+        m_builder = std::make_unique<ListBuilder>(m_env->path(u"commonappdata/Brimvault/Icons/"_s));
+        m_adder = std::make_unique<GameAdder>(*m_builder);
     }
-    void cleanup() { m_env.reset(); }
+    void cleanup()
+    {
+        m_adder.reset();
+        m_builder.reset();
+        m_env.reset();
+    }
 
     // The games folder's own files first, each folder before the ones below it, the program folder last;
     // Flash movies only from the games folder, never from its advertising folder.
     void installedGames()
     {
-        const QString g = u"commonappdata/Brimvault/"_s;
-        QVERIFY(write({g + u"root.exe"_s, g + u"b/b.exe"_s, g + u"b/sub/deep.exe"_s, g + u"stop/stopped.exe"_s,
-            g + u"flash/movie.swf"_s, g + u"Reclama/advert.exe"_s, u"program/prog.exe"_s,
-            u"program/tools/tool.exe"_s}));
-        QVERIFY(write({g + u"b/setup.exe"_s, g + u"b/MyINSTALLER.exe"_s, g + u"b/BrimvaultService.exe"_s,
-            g + u"b/t.exe"_s, g + u"b/unins000.exe"_s, g + u"b/readme.txt"_s, g + u"b/.hidden.exe"_s,
-            g + u"stop/below/hidden.exe"_s, g + u"Reclama/advert.swf"_s, g + u"Reclama/deeper/advert2.swf"_s,
-            u"program/Brimvault.exe"_s, u"program/program.swf"_s}));
+        QVERIFY(write(u"commonappdata/Brimvault/"_s,
+            {u"root.exe"_s, u"b/b.exe"_s, u"b/sub/deep.exe"_s, u"stop/stopped.exe"_s, u"flash/movie.swf"_s,
+                u"Reclama/advert.exe"_s, u"b/setup.exe"_s, u"b/.hidden.exe"_s, u"stop/below/hidden.exe"_s,
+                u"Reclama/advert.swf"_s, u"Reclama/deeper/advert2.swf"_s}));
+        QVERIFY(write(u"program/"_s, {u"prog.exe"_s, u"tools/tool.exe"_s, u"Brimvault.exe"_s, u"program.swf"_s}));
         QVERIFY(WriteFile(games(u"stop/DIRINFO.BVXINF"_s), "<>StopDir< Yes "));
         const Run run = discover();
         const QStringList paths = run.paths;
@@ -95,9 +120,10 @@ private Q_SLOTS:
     {
         const QString installed = games(u"inst/game.exe"_s);
         const QString added = path(u"mine/Added.exe"_s);
-        QVERIFY(write({u"windows/sol.exe"_s, u"windows/system32/sol.exe"_s, u"windows/system32/winmine.exe"_s,
-            u"windows/spider.exe"_s, u"windows/system32/notepad.exe"_s, u"mine/Added.exe"_s}));
-        QVERIFY(WriteFile(installed));
+        QVERIFY(write(u"windows/"_s,
+            {u"sol.exe"_s, u"system32/sol.exe"_s, u"system32/winmine.exe"_s, u"spider.exe"_s,
+                u"system32/notepad.exe"_s}));
+        QVERIFY(WriteFile(installed) && WriteFile(added));
         QVERIFY(WriteFile(m_env->settingsFile(),
             QString(u"[Files]\nCount=9\nFile1=  "_s + installed.toLower() + u" \nFile2= "_s + added + u"  \nFile3="_s
                 + installed.chopped(4) + u"\nFile5="_s + added + u"\nFile6="_s + path(u"missing.exe"_s))
@@ -132,8 +158,7 @@ private Q_SLOTS:
         QFETCH(QString, programFiles);
         QFETCH(QString, gamesFolder);
         QFETCH(bool, found);
-        QVERIFY(write({gamesFolder + u"/Chess/Chess.exe"_s, gamesFolder + u"/Chess/ZClientM.exe"_s,
-            gamesFolder + u"/hrtzzm.exe"_s}));
+        QVERIFY(write(gamesFolder, {u"/Chess/Chess.exe"_s, u"/Chess/ZClientM.exe"_s, u"/hrtzzm.exe"_s}));
         CatalogueLocations locations = CatalogueLocations::fromSystem();
         locations.windowsMajorVersion = version;
         locations.programFiles = path(programFiles);
@@ -147,8 +172,7 @@ private Q_SLOTS:
     void pinballFromTheFirstDrive()
     {
         const QString pinball = u"/Program Files/Windows NT/Pinball/PINBALL.exe"_s;
-        QVERIFY(write(
-            {u"wine/dosdevices/e:"_s + pinball, u"wine/dosdevices/d:"_s + pinball, u"wine/dosdevices/b:"_s + pinball}));
+        QVERIFY(write(u"wine/dosdevices/"_s, {u"e:"_s + pinball, u"d:"_s + pinball, u"b:"_s + pinball}));
         QCOMPARE(discover().paths, QStringList({path(u"wine/dosdevices/d:"_s) + pinball}));
     }
 
@@ -157,7 +181,6 @@ private Q_SLOTS:
         QTest::addColumn<int>("stopAt");
         QTest::addColumn<int>("items");
         QTest::newRow("before anything") << 0 << 0;
-        QTest::newRow("after the online entry") << 1 << 1;
         QTest::newRow("after an installed game") << 2 << 2;
         QTest::newRow("after a windows game") << 3 << 3;
         QTest::newRow("never") << 100 << 4;
@@ -165,13 +188,86 @@ private Q_SLOTS:
     void stopFlag()
     {
         QFETCH(int, stopAt);
-        QVERIFY(write({u"commonappdata/Brimvault/inst/game.exe"_s, u"windows/sol.exe"_s}));
+        QVERIFY(write(QString(), {u"commonappdata/Brimvault/inst/game.exe"_s, u"windows/sol.exe"_s}));
         QVERIFY(SaveSetting(AppTitle(), u"Files"_s, u"File1"_s, path(u"added.exe"_s)));
         const Run run = discover(CatalogueLocations::fromSystem(), stopAt);
         QTEST(int(run.entries.size()), "items");
         QTEST(run.result.items, "items");
         QCOMPARE(run.clears, stopAt > 0 ? 1 : 0);
         QCOMPARE(run.result.stopped, stopAt <= 3);
+    }
+
+    // Chosen by hand, the same file in other letter case and blanks is not added twice; an installer (by
+    // its version text) is skipped in a folder, yet a game when chosen by hand.
+    void addFileOnce()
+    {
+        m_builder->beginPass();
+        REQUIRE_FIXTURE(CopyFixture(CatalogueFixture(u"setup_desc.exe"_s), tree(u"puzzles.exe"_s))
+                && CopyFixture(PeFixture(u"multi64.exe"_s), tree(u"marble.exe"_s)),
+            "the executable fixtures (mingw-w64)");
+        const QList<GameEntry> added = m_adder->AddGamesFromFolder(tree());
+        QCOMPARE(pathsOf(added), QStringList({tree(u"marble.exe"_s)}));
+        QCOMPARE(added.first().caption, u"Marble Cascade"_s);
+        const auto chosen = m_adder->AddGameFile(tree(u"puzzles.exe"_s));
+        QVERIFY(chosen && chosen->caption == u"Puzzle Pack Setup Wizard"_s);
+        QVERIFY(!m_adder->AddGameFile(u"  "_s + tree(u"PUZZLES.EXE"_s).toUpper() + u" "_s));
+        QCOMPARE(filesSection(),
+            Pairs({{u"File1"_s, tree(u"marble.exe"_s)}, {u"Count"_s, u"2"_s}, {u"File2"_s, tree(u"puzzles.exe"_s)}}));
+    }
+
+    // Below the root first, each folder before its sub-folders; the stop-marked folder's own files are still
+    // taken, nothing below it; the root comes last. One folder per level keeps the listing order out of it.
+    // Numbers go on from the highest in use when the counter is below it.
+    void addFolderWalkOrder()
+    {
+        start("[Files]\nCount=2\nFile5=/old.exe\n");
+        QVERIFY(write(u"tree/"_s, {u"top.exe"_s, u"a/a.exe"_s, u"a/b/b.swf"_s, u"a/b/c/c.exe"_s, u"a/b/c/d/d.exe"_s}));
+        QVERIFY(WriteFile(tree(u"a/b/c/DirInfo.bvxinf"_s), "<>StopDir<Yes"));
+        QStringList sunk;
+        const QList<GameEntry> added
+            = m_adder->AddGamesFromFolder(tree(), [&sunk](const GameEntry& entry) { sunk.append(entry.path); });
+        const QStringList expected {
+            tree(u"a/a.exe"_s), tree(u"a/b/b.swf"_s), tree(u"a/b/c/c.exe"_s), tree(u"top.exe"_s)};
+        QCOMPARE(pathsOf(added), expected);
+        QCOMPARE(sunk, expected);
+        QCOMPARE(filesSection(),
+            Pairs({{u"Count"_s, u"9"_s}, {u"File5"_s, u"/old.exe"_s}, {u"File6"_s, expected.at(0)},
+                {u"File7"_s, expected.at(1)}, {u"File8"_s, expected.at(2)}, {u"File9"_s, expected.at(3)}}));
+    }
+
+    void addFolderFilters()
+    {
+        // A counter at the largest number there is leaves the games the free numbers.
+        start("[Files]\nCount=2147483647\nFile2=/old.exe\n");
+        QVERIFY(write(u"tree/"_s,
+            {u"game.exe"_s, u"movie.SWF"_s, u"setup.exe"_s, u"Install.exe"_s, u"uninst.exe"_s, u"t.exe"_s,
+                u"readme.txt"_s, u"page.htm"_s, u"Brimvault.exe"_s, u".hidden.exe"_s, u"listed.exe"_s}));
+        m_builder->AddGameToList(tree(u"LISTED.EXE"_s).toUpper());
+        const QStringList paths = pathsOf(m_adder->AddGamesFromFolder(tree()));
+        QCOMPARE(QSet<QString>(paths.begin(), paths.end()), QSet<QString>({tree(u"game.exe"_s), tree(u"movie.SWF"_s)}));
+        // A second scan finds everything listed and only rewrites the counter.
+        QVERIFY(m_adder->AddGamesFromFolder(tree()).isEmpty());
+        const Pairs files = filesSection();
+        QCOMPARE(files.mid(0, 2), Pairs({{u"Count"_s, u"2147483647"_s}, {u"File2"_s, u"/old.exe"_s}}));
+        QCOMPARE(QSet<QString>({files.at(2).first, files.at(3).first}), QSet<QString>({u"File1"_s, u"File3"_s}));
+        QCOMPARE(files.size(), 4);
+    }
+
+    // Executables only, in any case, installers too, each file once.
+    void drop()
+    {
+        start("[Files]\nCount=3\n");
+        QStringList files;
+        for (const char* name : {"a.exe", "b.EXE", "movie.swf", "readme.txt", "folder", "setup.exe", "A.EXE"})
+            files.append(tree(QString::fromLatin1(name)));
+        int sunk = 0;
+        const QList<GameEntry> entries = m_adder->AddDroppedFiles(files, [&sunk](const GameEntry&) { ++sunk; });
+        const QStringList added {tree(u"a.exe"_s), tree(u"b.EXE"_s), tree(u"setup.exe"_s)};
+        QCOMPARE(pathsOf(entries), added);
+        QCOMPARE(sunk, 3);
+        QCOMPARE(filesSection(),
+            Pairs({{u"Count"_s, u"6"_s}, {u"File4"_s, added.at(0)}, {u"File5"_s, added.at(1)},
+                {u"File6"_s, added.at(2)}}));
     }
 };
 BV_REGISTER_TEST(TestGameDiscovery);

@@ -12,23 +12,20 @@ public:
     TestEnvironment()
     {
         Q_ASSERT(m_root.isValid());
-        m_root.setAutoRemove(true);
-        for (const char* sub : {"settings", "commonappdata", "personal", "programfiles", "windows"})
-            QDir(m_root.path()).mkpath(QString::fromLatin1(sub));
-        qputenv("BRIMVAULT_SETTINGS_DIR", path(QStringLiteral("settings")).toLocal8Bit());
-        qputenv("BRIMVAULT_COMMON_APPDATA", path(QStringLiteral("commonappdata")).toLocal8Bit());
-        qputenv("BRIMVAULT_PERSONAL", path(QStringLiteral("personal")).toLocal8Bit());
-        qputenv("BRIMVAULT_PROGRAM_FILES", path(QStringLiteral("programfiles")).toLocal8Bit());
-        qputenv("windir", path(QStringLiteral("windows")).toLocal8Bit());
+        for (const auto& [sub, variable] : {std::pair {"settings", "BRIMVAULT_SETTINGS_DIR"},
+                 {"commonappdata", "BRIMVAULT_COMMON_APPDATA"}, {"personal", "BRIMVAULT_PERSONAL"},
+                 {"programfiles", "BRIMVAULT_PROGRAM_FILES"}, {"windows", "windir"}}) {
+            QDir(m_root.path()).mkpath(QLatin1String(sub));
+            qputenv(variable, path(QLatin1String(sub)).toLocal8Bit());
+        }
         qputenv("BRIMVAULT_CATALOGUE_ROOT", "http://127.0.0.1:9");
     }
 
+    // Only what this one set: an outer environment's program folder and locale stay.
     ~TestEnvironment()
     {
-        if (m_programDir)
-            qunsetenv("BRIMVAULT_PROGRAM_DIR");
-        if (m_locale)
-            qunsetenv("BRIMVAULT_LOCALE");
+        for (const char* variable : m_set)
+            qunsetenv(variable);
     }
     TestEnvironment(const TestEnvironment&) = delete;
     TestEnvironment& operator=(const TestEnvironment&) = delete;
@@ -38,23 +35,23 @@ public:
     {
         const QString dir = path(QStringLiteral("program"));
         QDir().mkpath(dir);
-        qputenv("BRIMVAULT_PROGRAM_DIR", dir.toLocal8Bit());
-        m_programDir = true;
+        set("BRIMVAULT_PROGRAM_DIR", dir.toLocal8Bit());
         return dir;
     }
     // The user's locale as the program sees it (BRIMVAULT_LOCALE, e.g. "ru_RU").
-    void setLocale(const QByteArray& name)
-    {
-        qputenv("BRIMVAULT_LOCALE", name);
-        m_locale = true;
-    }
+    void setLocale(const QByteArray& name) { set("BRIMVAULT_LOCALE", name); }
 
     QString root() const { return m_root.path(); }
     QString path(const QString& relative) const { return m_root.path() + u'/' + relative; }
     QString settingsFile() const { return path(QStringLiteral("settings/Brimvault.ini")); }
 
 private:
+    void set(const char* variable, const QByteArray& value)
+    {
+        qputenv(variable, value);
+        m_set.append(variable);
+    }
+
     QTemporaryDir m_root;
-    bool m_programDir = false;
-    bool m_locale = false;
+    QList<const char*> m_set;
 };

@@ -5,7 +5,6 @@
 #include <QFile>
 #include <QFileInfo>
 #include <QRandomGenerator>
-#include <QStandardPaths>
 
 #include <sys/stat.h>
 
@@ -62,9 +61,4 @@ QMap<QString, QByteArray> SnapshotTree(const QString& root)
             tree.insert(relative, QByteArrayLiteral("<special>"));
     }
     return tree;
-}
-
-bool HaveTool(const QString& program)
-{
-    return !QStandardPaths::findExecutable(program).isEmpty();
 }

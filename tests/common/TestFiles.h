@@ -2,6 +2,7 @@
 
 #include <QByteArray>
 #include <QMap>
+#include <QStandardPaths>
 #include <QString>
 
 // Files and trees for tests. Every writer makes the missing parent folders and fails the test (qFatal is
@@ -20,10 +21,9 @@ QMap<QString, QByteArray> SnapshotTree(const QString& root);
 
 // A tool or fixture the test needs: fails the test with what to install when it is missing, never skips.
 // Use as: REQUIRE_TOOL("wrestool", "icoutils");
-bool HaveTool(const QString& program);
 #define REQUIRE_TOOL(program, debianPackage)                                                                           \
     do {                                                                                                               \
-        if (!HaveTool(QStringLiteral(program)))                                                                        \
+        if (QStandardPaths::findExecutable(QStringLiteral(program)).isEmpty())                                         \
             QFAIL(qPrintable(QStringLiteral("%1 is missing: install the Debian package %2 (make test does)")           \
                                  .arg(QStringLiteral(program), QStringLiteral(debianPackage))));                       \
     } while (false)
