@@ -28,7 +28,7 @@ bool WritePicture(const QString& path, const QColor& colour, const QSize& size)
 
 bool WriteDueAdvertisement(const QString& reclamaFolder, const QString& clickAddress, const QColor& colour)
 {
-    const QString everyDay = QStringLiteral("X.X.X");
     return WritePicture(QDir(reclamaFolder).filePath(QStringLiteral("Image_summer.png")), colour)
-        && WriteReclamaInfo(reclamaFolder, {{QStringLiteral("image_summer"), clickAddress, everyDay, everyDay}});
+        && WriteReclamaInfo(reclamaFolder,
+            {{QStringLiteral("image_summer"), clickAddress, QStringLiteral("X.X.X"), QStringLiteral("X.X.X")}});
 }

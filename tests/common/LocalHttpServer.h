@@ -1,29 +1,21 @@
 #pragma once
 
-#include <QByteArray>
-#include <QHash>
 #include <QStringList>
 #include <QTcpServer>
 
-class QTcpSocket;
-
-// A real HTTP/1.1 server on 127.0.0.1: every request is answered with `status` and `body` (a redirect also
-// names a Location), and each request target is recorded in `targets`, in order.
+// A real HTTP/1.1 server on 127.0.0.1: every request is answered with `status` and the body "ok" (a redirect
+// also names a Location), and each request target is recorded in `targets`, in order.
 class LocalHttpServer : public QObject {
 public:
     LocalHttpServer();
 
     bool isListening() const { return m_server.isListening(); }
     // "http://127.0.0.1:<port>", without a closing slash.
-    QString root() const;
+    QString root() const { return QStringLiteral("http://127.0.0.1:%1").arg(m_server.serverPort()); }
 
     int status = 200;
-    QByteArray body = QByteArrayLiteral("ok");
     QStringList targets;
 
 private:
-    void answer(QTcpSocket* socket);
-
     QTcpServer m_server;
-    QHash<QTcpSocket*, QByteArray> m_buffers;
 };

@@ -7,12 +7,7 @@
 QString MissingRuffle();
 
 // Tests that play Flash fail, naming what to install, when Ruffle is missing.
-#define REQUIRE_RUFFLE()                                                                                               \
-    do {                                                                                                               \
-        const QString missingRuffle = MissingRuffle();                                                                 \
-        if (!missingRuffle.isEmpty())                                                                                  \
-            QFAIL(qPrintable(missingRuffle));                                                                          \
-    } while (false)
+#define REQUIRE_RUFFLE() QVERIFY2(MissingRuffle().isEmpty(), qPrintable(MissingRuffle()))
 
 // A copy of the program's Ruffle files (host page, script, WebAssembly) in `folder`, to be damaged by a test.
 bool CopyRuffleTo(const QString& folder);

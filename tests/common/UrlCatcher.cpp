@@ -2,16 +2,14 @@
 
 #include <QDesktopServices>
 
-static const char* const CaughtSchemes[] = {"file", "http", "https"};
-
 UrlCatcher::UrlCatcher()
 {
-    for (const char* scheme : CaughtSchemes)
+    for (const char* scheme : {"file", "http", "https"})
         QDesktopServices::setUrlHandler(QString::fromLatin1(scheme), this, "open");
 }
 
 UrlCatcher::~UrlCatcher()
 {
-    for (const char* scheme : CaughtSchemes)
+    for (const char* scheme : {"file", "http", "https"})
         QDesktopServices::unsetUrlHandler(QString::fromLatin1(scheme));
 }

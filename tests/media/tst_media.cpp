@@ -129,13 +129,11 @@ private Q_SLOTS:
         WriteBrowserEmulationValues();
         WriteBrowserEmulationValues();
         QVERIFY(SaveDword(RegistryRoot::LocalMachine, u"SOFTWARE\\Test"_s, u"Brimvault.exe"_s, 11001));
-        QVERIFY(SaveDword(RegistryRoot::ClassesRoot, u"SOFTWARE\\Test"_s, u"Brimvault.exe"_s, 0xffffffff));
         const QByteArray bytes = ReadFile(BrowserEmulationFile());
         QVERIFY(bytes.contains("; kept by hand") && bytes.contains("this line is damaged"));
         const IniDocument ini = IniDocument::parse(bytes);
         QCOMPARE(ini.value(u"Other"_s, u"keep"_s), u"1"_s);
         QCOMPARE(ini.value(u"HKEY_LOCAL_MACHINE\\SOFTWARE\\Test"_s, u"brimvault.exe"_s), u"dword:00002af9"_s);
-        QCOMPARE(ini.value(u"HKEY_CLASSES_ROOT\\SOFTWARE\\Test"_s, u"brimvault.exe"_s), u"dword:ffffffff"_s);
         for (const QString& key : {u"Microsoft"_s, u"Wow6432Node\\Microsoft"_s}) {
             const QString section = u"HKEY_CURRENT_USER\\SOFTWARE\\"_s + key
                 + u"\\Internet Explorer\\MAIN\\FeatureControl\\FEATURE_BROWSER_EMULATION"_s;
