@@ -5,7 +5,6 @@
 #include <QList>
 #include <QString>
 #include <QStringList>
-#include <utility>
 
 // What the launch recorder (tests/gameactions/launchrecorder.cpp) wrote: one entry per start of a program
 // copied from it, in <folder>/<program file name>.record.
@@ -21,16 +20,9 @@ inline QList<LaunchRecord> ReadLaunchRecords(const QString& recordFolder, const 
     QList<LaunchRecord> records;
     if (!file.open(QIODevice::ReadOnly))
         return records;
-    LaunchRecord current;
     for (const QString& line : QString::fromLocal8Bit(file.readAll()).split(u'\n', Qt::SkipEmptyParts)) {
-        if (line.startsWith(QStringLiteral("program=")))
-            current.program = line.mid(8);
-        else if (line.startsWith(QStringLiteral("cwd=")))
-            current.workingFolder = line.mid(4);
-        else if (line.startsWith(QStringLiteral("arg=")))
-            current.arguments.append(line.mid(4));
-        else if (line == QStringLiteral("end"))
-            records.append(std::exchange(current, {}));
+        const QStringList fields = line.split(u'\t');
+        records.append({fields.value(0), fields.value(1), fields.mid(2)});
     }
     return records;
 }

@@ -2,25 +2,17 @@
 
 using namespace Brimvault;
 
-namespace {
-
-PromptAnswer Fit(PromptAnswer wanted, PromptButtons buttons)
+static PromptAnswer Fit(PromptAnswer wanted, PromptButtons buttons)
 {
     const bool agree = wanted == PromptAnswer::Yes || wanted == PromptAnswer::Ok;
-    switch (buttons) {
-    case PromptButtons::Ok:
+    if (buttons == PromptButtons::Ok)
         return PromptAnswer::Ok;
-    case PromptButtons::OkCancel:
+    if (buttons == PromptButtons::OkCancel)
         return agree ? PromptAnswer::Ok : PromptAnswer::Cancel;
-    case PromptButtons::YesNo:
+    if (buttons == PromptButtons::YesNo)
         return agree ? PromptAnswer::Yes : PromptAnswer::No;
-    case PromptButtons::YesNoCancel:
-        return wanted == PromptAnswer::Ok ? PromptAnswer::Yes : wanted;
-    }
-    return wanted;
+    return wanted == PromptAnswer::Ok ? PromptAnswer::Yes : wanted;
 }
-
-} // namespace
 
 PromptRecorder::PromptRecorder(PromptAnswer answer)
     : answer(answer)

@@ -13,8 +13,7 @@ class PromptRecorder {
 public:
     explicit PromptRecorder(Brimvault::PromptAnswer answer = Brimvault::PromptAnswer::Yes);
     ~PromptRecorder();
-    PromptRecorder(const PromptRecorder&) = delete;
-    PromptRecorder& operator=(const PromptRecorder&) = delete;
+    Q_DISABLE_COPY(PromptRecorder)
 
     // The texts of the recorded message boxes, in order.
     QStringList texts() const;

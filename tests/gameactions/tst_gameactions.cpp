@@ -4,10 +4,12 @@
 #include "gameactions/GameRenaming.h"
 #include "gameactions/LaunchRules.h"
 #include "gameactions/PackageInstallCommand.h"
+#include "gameactions/PlayTimeWatcher.h"
 #include "gameactions/ServiceSignal.h"
 
 #include "store/CatalogueStore.h"
 #include "store/DataFolders.h"
+#include "store/PlayHistory.h"
 #include "store/SettingsStore.h"
 
 #include "LaunchRecords.h"
@@ -15,11 +17,11 @@
 #include "PromptRecorder.h"
 #include "TestEnvironment.h"
 #include "TestFiles.h"
-#include "TestSuite.h"
 #include "UrlCatcher.h"
 
 #include <QElapsedTimer>
 #include <QSignalSpy>
+#include <QTest>
 #include <algorithm>
 
 using namespace Brimvault;
@@ -66,6 +68,7 @@ private Q_SLOTS:
         QDir::setCurrent(m_savedFolder);
         qputenv("PATH", m_savedPath);
         qunsetenv("BV_LAUNCH_EXIT");
+        qunsetenv("BV_LAUNCH_SECONDS");
         m_prompts.reset();
         m_urls.reset();
         m_env.reset();
@@ -79,16 +82,12 @@ private Q_SLOTS:
         const LaunchKind web = LaunchKind::WebPage, movie = LaunchKind::FlashMovie, process = LaunchKind::Process;
         const QString code = u"20071231235959000001"_s;
         QTest::newRow("htm") << u"/g/page.HTM"_s << web << QString();
-        QTest::newRow("aspx") << u"/g/x.aspx"_s << web << QString();
-        QTest::newRow("mht") << u"/g/saved.mht"_s << web << QString();
         QTest::newRow("php") << u"/g/game.php"_s << web << QString();
         QTest::newRow("asp query, any case") << u"/g/start?Page.ASP?id=1"_s << web << QString();
         QTest::newRow("address") << u" HTTPS://127.0.0.1:9/games"_s << web << QString();
         QTest::newRow("ht") << u"/g/x.ht"_s << process << QString();
-        QTest::newRow("exe") << u"/g/sol.exe"_s << process << QString();
         QTest::newRow("numbered movie") << u"/f/20071231235959000001.SWF"_s << movie << code;
         QTest::newRow("longer name, first 20") << u"/f/2007123123595900000177 Racer.swf"_s << movie << code;
-        QTest::newRow("middle not tested") << u"/f/20xx-yy-zz game 0005.swf"_s << movie << u"20xx-yy-zz game 0005"_s;
         QTest::newRow("shorter than 20") << u"/f/2007123123595900001.swf"_s << movie << QString();
         QTest::newRow("20th not a digit") << u"/f/200712312359590000xA.swf"_s << movie << QString();
         QTest::newRow("not starting with 20") << u"/f/19071231235959000001.swf"_s << movie << QString();
@@ -100,50 +99,56 @@ private Q_SLOTS:
         QTEST(ArticleCode(path), "articleCode");
     }
 
-    // "{root}" stands for the test's folder. The catalogue server is asked only about a numbered movie, whose
-    // article then opens instead of the movie.
+    // "{root}" stands for the test's folder, "{server}" for the catalogue server, which is asked only about a
+    // numbered movie, whose article then opens instead of the movie.
     void launchItem_data()
     {
         QTest::addColumn<QString>("item");
         QTest::addColumn<bool>("offline");
-        QTest::addColumn<bool>("connected");
+        QTest::addColumn<bool>("serverUp");
         QTest::addColumn<QString>("opened"); // null: the movie plays in a media host window
-        QTest::addColumn<int>("probes");
+        QTest::addColumn<int>("asked");
         const QString movie = u"{root}/20071231235959000001.swf"_s;
-        const QString article = u"http://127.0.0.1:9/OnlineGamesArticle.asp?code=20071231235959000001"_s;
+        const QString article = u"{server}/OnlineGamesArticle.asp?code=20071231235959000001"_s;
         QTest::newRow("page") << u"{root}/page.htm"_s << false << true << u"file://{root}/page.htm"_s << 0;
         QTest::newRow("numbered movie") << movie << false << true << article << 1;
         QTest::newRow("open game offline") << movie << true << true << QString() << 0;
-        QTest::newRow("server unreachable") << movie << false << false << QString() << 1;
+        QTest::newRow("server unreachable") << movie << false << false << QString() << 0;
         QTest::newRow("other movie") << u"{root}/Racer.swf"_s << false << true << QString() << 0;
     }
     void launchItem()
     {
         QFETCH(QString, item);
         QFETCH(bool, offline);
-        QFETCH(bool, connected);
         QFETCH(QString, opened);
-        for (const QString& file : {u"page.htm"_s, u"20071231235959000001.swf"_s, u"Racer.swf"_s})
-            QVERIFY(WriteFile(root(file)));
+        QFETCH(bool, serverUp);
+        LocalHttpServer server;
+        QVERIFY(server.isListening());
+        if (serverUp)
+            qputenv("BRIMVAULT_CATALOGUE_ROOT", server.root().toLocal8Bit());
         GameLauncher launcher;
-        int probes = 0;
-        launcher.setConnectionProbe([&probes, connected] { return ++probes, connected; });
-        launcher.setCatalogueRoot([] { return u"http://127.0.0.1:9/"_s; });
         QSignalSpy movies(&launcher, &GameLauncher::flashMovieRequested);
-        item.replace(u"{root}"_s, m_env->root());
+        QVERIFY(WriteFile(item.replace(u"{root}"_s, m_env->root())));
+        // The service hears of the launcher's first launch, even a failed one, and of that one only.
+        launcher.launchItem(root(u"gone"_s), QString());
         offline ? launcher.launchOffline(u" "_s + item + u" "_s, u" Racer  "_s)
                 : launcher.launchItem(item, u" Racer  "_s);
-        QTEST(probes, "probes");
+        QTEST(int(server.targets.size()), "asked");
         QCOMPARE(QList<QVariantList>(movies),
             (opened.isNull() ? QList<QVariantList> {{item, u"Racer"_s}} : QList<QVariantList>()));
-        QCOMPARE(m_urls->opened,
-            opened.isNull() ? QList<QUrl>() : QList<QUrl> {QUrl(opened.replace(u"{root}"_s, m_env->root()))});
-        // Web page or movie: the service hears of the first launch all the same.
-        QTRY_COMPARE(records(u"BrimvaultService"_s).size(), 1);
+        opened.replace(u"{root}"_s, m_env->root()).replace(u"{server}"_s, server.root());
+        QCOMPARE(m_urls->opened, opened.isNull() ? QList<QUrl>() : QList<QUrl> {QUrl(opened)});
+        QTRY_VERIFY(!records(u"BrimvaultService"_s).isEmpty());
+        QTest::qWait(200);
+        const QList<LaunchRecord> service = records(u"BrimvaultService"_s);
+        QCOMPARE(service.size(), 1);
+        QCOMPARE(QStringList(service.first().arguments) << service.first().program,
+            (QStringList {u"-R"_s, root(u"program/BrimvaultService"_s)}));
     }
 
     // A Windows game starts in its own folder, which stays current, through the runner of the settings (with
-    // its own arguments), a blank setting meaning the default; blanks in the game's path need no quotes.
+    // its own arguments), a blank setting meaning the default; blanks in the game's path need no quotes. The
+    // launch does not wait: the play time is added when the process ends.
     void startProcess_data()
     {
         QTest::addColumn<QString>("setting"); // "{root}" stands for the test's folder
@@ -162,39 +167,22 @@ private Q_SLOTS:
         QVERIFY(install(runner) && WriteFile(game));
         QVERIFY(SaveSetting(
             AppTitle(), u"Settings"_s, u"CompatibilityRunner"_s, setting.replace(u"{root}"_s, m_env->root())));
-        GameLauncher().launchItem(game, QString());
-        QTRY_COMPARE(records(QFileInfo(runner).fileName()).size(), 1);
-        const LaunchRecord record = records(QFileInfo(runner).fileName()).first();
+        qputenv("BV_LAUNCH_SECONDS", "1");
+        GameLauncher launcher;
+        QSignalSpy ended(launcher.playTime(), &PlayTimeWatcher::ended);
+        launcher.launchItem(game.toUpper(), QString());
         const QString folder = root(u"Program Files/Card Games"_s);
-        QCOMPARE(QStringList({record.program, record.workingFolder, QDir::currentPath()}),
-            QStringList({root(runner), folder, folder}));
-        QCOMPARE(record.arguments, arguments << game);
-    }
-
-    // Without a probe of its own the launcher asks the catalogue server itself.
-    void articleAsksTheCatalogueServer()
-    {
-        LocalHttpServer server;
-        QVERIFY(server.isListening() && WriteFile(root(u"20071231235959000001.swf"_s)));
-        qputenv("BRIMVAULT_CATALOGUE_ROOT", server.root().toLocal8Bit());
-        GameLauncher().launchItem(root(u"20071231235959000001.swf"_s), u"Racer"_s);
-        QCOMPARE(server.targets.size(), 1);
-        QVERIFY(server.targets.first().startsWith(u"/GetBrimvaultConnection.asp?rnd="));
-        QCOMPARE(m_urls->opened,
-            QList<QUrl>({QUrl(server.root() + u"/OnlineGamesArticle.asp?code=20071231235959000001"_s)}));
-    }
-
-    // Once per run of the program (per launcher), even when the launch fails.
-    void serviceSignalledOncePerRun()
-    {
-        GameLauncher first, second;
-        for (GameLauncher* launcher : {&first, &first, &second})
-            launcher->launchItem(root(u"gone"_s), QString());
-        QTRY_COMPARE(records(u"BrimvaultService"_s).size(), 2);
-        QTest::qWait(200);
-        QCOMPARE(records(u"BrimvaultService"_s).size(), 2);
-        QCOMPARE(records(u"BrimvaultService"_s).first().program, root(u"program/BrimvaultService"_s));
-        QCOMPARE(records(u"BrimvaultService"_s).first().arguments, QStringList {u"-R"_s});
+        QCOMPARE(QDir::currentPath(), folder);
+        QCOMPARE(PlayHistory::Read(game).launches, 1);
+        QCOMPARE(PlayHistory::Read(game).playSeconds, 0);
+        QVERIFY(ended.wait(20000));
+        const qint64 seconds = ended.first().at(1).toLongLong();
+        QVERIFY2(seconds >= 1 && seconds < 20, qPrintable(QString::number(seconds)));
+        QCOMPARE(PlayHistory::Read(game).playSeconds, seconds);
+        const QList<LaunchRecord> started = records(QFileInfo(runner).fileName());
+        QCOMPARE(started.size(), 1);
+        QCOMPARE(QStringList({started.first().program, started.first().workingFolder}) + started.first().arguments,
+            QStringList({root(runner), folder}) + arguments << game);
     }
 
     // Success only means the service ended, whatever its exit code; its record is there at once.
@@ -232,8 +220,8 @@ private Q_SLOTS:
     }
 
     // A file that cannot be moved aside (its ".bak" name is taken by a folder) brings back those already moved.
-    // A path climbing out of the games folder is no installed game: nothing is deleted.
-    void removeInstalledGame_data()
+    // A path outside the games folder, even one climbing out of it, is only forgotten: nothing is deleted.
+    void removeGame_data()
     {
         QTest::addColumn<QString>("files"); // in the games folder, separated by blanks
         QTest::addColumn<QString>("item");
@@ -241,8 +229,6 @@ private Q_SLOTS:
         QTest::addColumn<bool>("removed");
         QTest::newRow("own folder") << u"Pack/Lines/lines.exe Pack/Lines/.settings Pack/Lines/Data/1.dat Pack/read.me"_s
                                     << u"Pack/Lines/lines.exe"_s << u"Pack/ Pack/read.me"_s << true;
-        QTest::newRow("own folder already gone")
-            << u"Other/other.exe"_s << u"Gone/gone.exe"_s << u"Other/ Other/other.exe"_s << false;
         QTest::newRow("loose files") << u"lines.exe lines.bvxinf LINES.dat linesx.exe other.exe"_s << u"lines.exe"_s
                                      << u"linesx.exe other.exe"_s << true;
         QTest::newRow("loose file without extension")
@@ -253,15 +239,17 @@ private Q_SLOTS:
         QTest::newRow("climbing out") << u"Lines/lines.exe"_s << u"Lines/../../outside/Game/game.exe"_s
                                       << u"Lines/ Lines/lines.exe"_s << true;
     }
-    void removeInstalledGame()
+    void removeGame()
     {
         QFETCH(QString, files);
         QFETCH(QString, item);
         QFETCH(bool, removed);
         QVERIFY(create(files.split(u' ') << u"../outside/Game/game.exe"_s));
-        // Renamed once: an entry under "Files" too, with a display name.
+        // Added twice (letter case and blanks differ) and renamed; another added game stays.
         const QString key = CatalogueStore::AddGame(games(item).toUpper());
         CatalogueStore::SetDisplayName(key, u"My Lines"_s);
+        CatalogueStore::AddGame(u"  "_s + games(item).toLower());
+        CatalogueStore::AddGame(root(u"other.exe"_s));
         QCOMPARE(
             AskAndRemoveGame(u"  Lines "_s, games(item)), removed ? RemovalOutcome::Removed : RemovalOutcome::Failed);
         QTEST(SnapshotTree(games(QString())).keys().join(u' '), "after");
@@ -271,7 +259,7 @@ private Q_SLOTS:
                 + (removed ? QStringList() : QStringList {u"There was an error! The game isn't removed!"_s}));
         QCOMPARE(m_prompts->prompts.last().icon, removed ? PromptIcon::Question : PromptIcon::Critical);
         QCOMPARE(m_prompts->prompts.first().title, u"Brimvault"_s);
-        QCOMPARE(bool(CatalogueStore::FindAddedGame(games(item))), !removed);
+        QCOMPARE(CatalogueStore::AddedGames().size(), removed ? 1 : 3);
         QCOMPARE(CatalogueStore::DisplayName(key), removed ? QString() : u"My Lines"_s);
     }
 
@@ -290,31 +278,19 @@ private Q_SLOTS:
         QVERIFY(QFileInfo::exists(games(u"../precious/photo"_s)));
     }
 
-    // Every entry of the path (trimmed, any case) is forgotten, with its name; the file stays.
-    void addedGameIsForgottenNotDeleted()
-    {
-        const QString added = m_env->path(u"personal/My Games/Tetra/tetra"_s);
-        QVERIFY(WriteFile(added));
-        CatalogueStore::SetDisplayName(CatalogueStore::AddGame(m_env->path(u"personal/first.exe"_s)), u"First"_s);
-        CatalogueStore::SetDisplayName(CatalogueStore::AddGame(u"  "_s + added.toLower() + u" "_s), u"Tetra!"_s);
-        CatalogueStore::AddGame(added);
-        QCOMPARE(AskAndRemoveGame(u"Tetra!"_s, added), RemovalOutcome::Removed);
-        QVERIFY(QFileInfo::exists(added));
-        QCOMPARE(GetAllSettings(AppTitle(), u"Files"_s),
-            (Settings {{u"Count"_s, u"3"_s}, {u"File1"_s, m_env->path(u"personal/first.exe"_s)}}));
-        QCOMPARE(GetAllSettings(AppTitle(), u"FilesNames"_s), (Settings {{u"FileName1"_s, u"First"_s}}));
-    }
-
-    // Removing all added games keeps their display names; with none left there is nothing to rebuild.
+    // Answered No, nothing goes. Removing all added games keeps their display names; with none left there is
+    // nothing to rebuild.
     void removeAllAddedGames()
     {
-        CatalogueStore::SetDisplayName(CatalogueStore::AddGame(root(u"a.exe"_s)), u"Game A"_s);
+        const QString game = root(u"a.exe"_s), all = u"Remove all added games?      "_s;
+        CatalogueStore::SetDisplayName(CatalogueStore::AddGame(game), u"Game A"_s);
         m_prompts->answer = PromptAnswer::No;
         QVERIFY(!AskAndRemoveAllAddedGames());
+        QCOMPARE(AskAndRemoveGame(u"Game A"_s, game), RemovalOutcome::Cancelled);
         m_prompts->answer = PromptAnswer::Yes;
         QVERIFY(AskAndRemoveAllAddedGames());
         QVERIFY(!AskAndRemoveAllAddedGames());
-        QCOMPARE(m_prompts->texts(), QStringList(3, u"Remove all added games?      "_s));
+        QCOMPARE(m_prompts->texts(), (QStringList {all, u"Remove Game A?"_s, all, all}));
         QCOMPARE(m_prompts->prompts.first().buttons, PromptButtons::YesNo);
         QVERIFY(CatalogueStore::AddedGames().isEmpty());
         QCOMPARE(GetAllSettings(AppTitle(), u"FilesNames"_s), (Settings {{u"FileName1"_s, u"Game A"_s}}));
@@ -322,17 +298,25 @@ private Q_SLOTS:
 
     // The first entry of the path (matched trimmed, in any case) takes the name; a later duplicate does not. A
     // discovered game becomes an added one under its upper-cased path, found again by the next renaming.
+    // Cancelled, answered empty or a web entry (not even asked about): nothing is stored.
     void renameGame()
     {
         CatalogueStore::AddGame(u"/games/a.exe"_s);
         CatalogueStore::AddGame(u" /Games/Tetra/tetra.swf "_s);
         CatalogueStore::AddGame(u"/games/tetra/TETRA.SWF"_s);
+        for (const std::optional<QString>& answer : {std::optional<QString>(), std::optional(QString())}) {
+            m_prompts->inputText = answer;
+            QVERIFY(!AskAndRenameGame(u"  Tetra  "_s, u"/games/x.exe"_s));
+        }
+        m_prompts->inputText = u"Web"_s;
+        QVERIFY(!AskAndRenameGame(u"Web"_s, u"  Https://127.0.0.1:9/"_s));
         for (const QString& name : {u"Falling Blocks"_s, u"Patience"_s, u"Klondike"_s}) {
             m_prompts->inputText = name;
-            QCOMPARE(AskAndRenameGame(u"  Tetra  "_s,
+            QCOMPARE(AskAndRenameGame(u"Tetra"_s,
                          name == u"Falling Blocks" ? u"/games/tetra/tetra.swf"_s : u"/windows/system32/sol.exe"_s),
                 std::optional(name));
         }
+        QCOMPARE(m_prompts->inputs.size(), 5);
         const InputRequest asked = m_prompts->inputs.first();
         QCOMPARE(QStringList({asked.prompt, asked.title, asked.defaultText}),
             QStringList({u"Edit game name"_s, u"Brimvault"_s, u"Tetra"_s}));
@@ -341,20 +325,6 @@ private Q_SLOTS:
             (Settings {{u"FileName2"_s, u"Falling Blocks"_s}, {u"FileName4"_s, u"Klondike"_s}}));
         QCOMPARE(CatalogueStore::EntryCount(), 4);
     }
-
-    // Cancelled, answered empty or a web entry (not even asked about): nothing is stored.
-    void renameChangesNothing()
-    {
-        for (const std::optional<QString>& answer : {std::optional<QString>(), std::optional(QString())}) {
-            m_prompts->inputText = answer;
-            QVERIFY(!AskAndRenameGame(u"Caption"_s, u"/games/x.exe"_s));
-        }
-        m_prompts->inputText = u"Web"_s;
-        QVERIFY(!AskAndRenameGame(u"Caption"_s, u"  Https://127.0.0.1:9/"_s));
-        QCOMPARE(m_prompts->inputs.size(), 2);
-        QVERIFY(
-            GetAllSettings(AppTitle(), u"Files"_s).isEmpty() && GetAllSettings(AppTitle(), u"FilesNames"_s).isEmpty());
-    }
 };
-BV_REGISTER_TEST(TestGameActions);
+QTEST_MAIN(TestGameActions)
 #include "tst_gameactions.moc"
