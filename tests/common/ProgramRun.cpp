@@ -12,6 +12,7 @@
 #include <QProcess>
 
 using namespace Brimvault;
+using namespace Qt::StringLiterals;
 
 QString ProgramPath()
 {
@@ -32,10 +33,10 @@ bool copyInto(const QString& source, const QString& folder)
         && QFile::setPermissions(target, QFile::permissions(source) | QFileDevice::ReadOwner);
 }
 
-// Waits for the process, killing it after the time limit; true when it ended by itself.
-bool finish(QProcess& process, int timeoutMs)
+// Waits a minute for the process, then kills it; true when it ended by itself.
+bool finish(QProcess& process)
 {
-    if (process.waitForFinished(timeoutMs))
+    if (process.waitForFinished(60000))
         return true;
     process.kill();
     process.waitForFinished(10000);
@@ -52,41 +53,28 @@ ProgramFolderCopy::ProgramFolderCopy()
     for (const CompanionComponent& component : CompanionComponents())
         m_valid = m_valid && copyInto(QStringLiteral(BRIMVAULT_BIN_DIR "/") + component.fileName, m_dir.path());
     const QDir languages(QStringLiteral(BRIMVAULT_SOURCE_DIR "/lang"));
-    for (const QString& name : languages.entryList({QStringLiteral("*.lng")}, QDir::Files))
+    for (const QString& name : languages.entryList({u"*.lng"_s}, QDir::Files))
         m_valid = m_valid && copyInto(languages.filePath(name), m_dir.path());
 }
 
 bool ProgramOutcome::showedWindow() const
 {
-    return finished && !crashed && exitCode == 0 && prompts.isEmpty() && window
-        && window->value(QStringLiteral("visible")).toBool();
+    return finished && !crashed && exitCode == 0 && prompts.isEmpty() && window && window->value(u"visible"_s).toBool();
 }
 
 bool ProgramOutcome::stoppedWithAdminMessage() const
 {
-    if (!finished || crashed || exitCode != 1 || window || prompts.size() != 1)
-        return false;
-    const QJsonObject& box = prompts.first();
-    return box.value(QStringLiteral("text")).toString()
-        == QStringLiteral("You need to run the program as administrator!")
-        && box.value(QStringLiteral("title")).toString() == QStringLiteral("Brimvault")
-        && box.value(QStringLiteral("icon")).toString() == QStringLiteral("critical")
-        && box.value(QStringLiteral("buttons")).toString() == QStringLiteral("ok");
-}
-
-QStringList ProgramOutcome::promptTexts() const
-{
-    QStringList texts;
-    for (const QJsonObject& prompt : prompts)
-        texts.append(prompt.value(QStringLiteral("text")).toString());
-    return texts;
+    const QJsonObject message {{u"kind"_s, u"message"_s},
+        {u"text"_s, u"You need to run the program as administrator!"_s}, {u"title"_s, u"Brimvault"_s},
+        {u"icon"_s, u"critical"_s}, {u"buttons"_s, u"ok"_s}};
+    return finished && !crashed && exitCode == 1 && !window && prompts == QList {message};
 }
 
 QStringList ProgramOutcome::items(const QString& field) const
 {
     QStringList values;
     if (window) {
-        for (const QJsonValue& item : window->value(QStringLiteral("items")).toArray())
+        for (const QJsonValue& item : window->value(u"items"_s).toArray())
             values.append(item.toObject().value(field).toString());
     }
     return values;
@@ -94,47 +82,41 @@ QStringList ProgramOutcome::items(const QString& field) const
 
 QString ProgramOutcome::describe() const
 {
-    return QStringLiteral("finished=%1 crashed=%2 exit=%3\nprompts: %4\nwindow: %5\nstderr: %6")
-        .arg(finished)
+    QStringList texts;
+    for (const QJsonObject& prompt : prompts)
+        texts.append(prompt.value(u"text"_s).toString());
+    return u"finished=%1 crashed=%2 exit=%3\nprompts: %4\nwindow: %5\nstderr: %6"_s.arg(finished)
         .arg(crashed)
         .arg(exitCode)
-        .arg(promptTexts().join(QStringLiteral(" | ")),
-            window ? QString::fromUtf8(QJsonDocument(*window).toJson(QJsonDocument::Compact)) : QStringLiteral("-"),
+        .arg(texts.join(u" | "_s),
+            window ? QString::fromUtf8(QJsonDocument(*window).toJson(QJsonDocument::Compact)) : u"-"_s,
             standardError.right(2000));
 }
 
 ProgramOutcome RunProgram(
-    const TestEnvironment& environment, const QString& programFolder, const ProgramRunOptions& options)
+    const TestEnvironment& environment, const QString& programFolder, const QMap<QString, QString>& changes)
 {
-    const QString promptLog = environment.path(QStringLiteral("prompts.jsonl"));
-    const QString windowReport = environment.path(QStringLiteral("window.json"));
+    const QString promptLog = environment.path(u"prompts.jsonl"_s);
+    const QString windowReport = environment.path(u"window.json"_s);
     QFile::remove(promptLog);
     QFile::remove(windowReport);
-
-    QProcessEnvironment variables = QProcessEnvironment::systemEnvironment();
-    variables.insert(QStringLiteral("QT_QPA_PLATFORM"), QStringLiteral("offscreen"));
-    variables.insert(QStringLiteral("BRIMVAULT_PROGRAM_DIR"), programFolder);
-    variables.insert(QStringLiteral("BRIMVAULT_LOCALE"), QStringLiteral("en_US"));
-    variables.insert(QStringLiteral("BRIMVAULT_PROMPT_LOG"), promptLog);
-    variables.insert(QStringLiteral("BRIMVAULT_WINDOW_REPORT"), windowReport);
-    for (auto it = options.setEnvironment.cbegin(); it != options.setEnvironment.cend(); ++it)
-        variables.insert(it.key(), it.value());
-    for (const QString& name : options.unsetEnvironment)
-        variables.remove(name);
+    QMap<QString, QString> variables {{u"QT_QPA_PLATFORM"_s, u"offscreen"_s}, {u"BRIMVAULT_LOCALE"_s, u"en_US"_s},
+        {u"BRIMVAULT_PROGRAM_DIR"_s, programFolder.isEmpty() ? QString() : programFolder},
+        {u"BRIMVAULT_PROMPT_LOG"_s, promptLog}, {u"BRIMVAULT_WINDOW_REPORT"_s, windowReport}};
+    variables.insert(changes);
+    QProcessEnvironment system = QProcessEnvironment::systemEnvironment();
+    for (auto it = variables.cbegin(); it != variables.cend(); ++it)
+        it->isNull() ? system.remove(it.key()) : system.insert(it.key(), it.value());
 
     QProcess program;
-    program.setProcessEnvironment(variables);
+    program.setProcessEnvironment(system);
     program.setWorkingDirectory(environment.root());
     program.start(ProgramPath(), {});
     ProgramOutcome outcome;
-    if (!program.waitForStarted(10000)) {
-        outcome.standardError = program.errorString();
-        return outcome;
-    }
-    outcome.finished = finish(program, options.timeoutMs);
+    outcome.finished = finish(program);
     outcome.crashed = outcome.finished && program.exitStatus() == QProcess::CrashExit;
     outcome.exitCode = program.exitCode();
-    outcome.standardError = QString::fromLocal8Bit(program.readAllStandardError());
+    outcome.standardError = program.errorString() + u'\n' + QString::fromLocal8Bit(program.readAllStandardError());
     for (const QByteArray& line : ReadFile(promptLog).split('\n')) {
         if (!line.trimmed().isEmpty())
             outcome.prompts.append(QJsonDocument::fromJson(line).object());
@@ -144,15 +126,15 @@ ProgramOutcome RunProgram(
     return outcome;
 }
 
-int RunService(const QStringList& arguments, QString* output, int timeoutMs)
+int RunService(const QStringList& arguments, QString* output)
 {
     QProcess service;
     QProcessEnvironment variables = QProcessEnvironment::systemEnvironment();
-    variables.insert(QStringLiteral("QT_QPA_PLATFORM"), QStringLiteral("offscreen"));
+    variables.insert(u"QT_QPA_PLATFORM"_s, u"offscreen"_s);
     service.setProcessEnvironment(variables);
     service.setProcessChannelMode(QProcess::MergedChannels);
     service.start(ServicePath(), arguments);
-    const bool ended = finish(service, timeoutMs) && service.exitStatus() == QProcess::NormalExit;
+    const bool ended = finish(service) && service.exitStatus() == QProcess::NormalExit;
     if (output)
         *output = QString::fromLocal8Bit(service.readAll());
     return ended ? service.exitCode() : -1;

@@ -4,7 +4,6 @@
 #include <QList>
 #include <QMap>
 #include <QString>
-#include <QStringList>
 #include <QTemporaryDir>
 
 #include <optional>
@@ -42,24 +41,18 @@ struct ProgramOutcome {
     bool showedWindow() const;
     // Start-up's one message, critical with OK and titled "Brimvault"; no window; exit code 1.
     bool stoppedWithAdminMessage() const;
-    QStringList promptTexts() const;
     // One field ("caption", "data", "picture") of every list item, in list order.
     QStringList items(const QString& field) const;
     // Everything worth printing when a check fails.
     QString describe() const;
 };
 
-struct ProgramRunOptions {
-    QMap<QString, QString> setEnvironment;
-    QStringList unsetEnvironment;
-    int timeoutMs = 60000;
-};
-
 // Starts the real program without arguments in the test's environment, offscreen, with the prompt log and the
-// window report switched on, and waits for it to end (killing it after the time limit).
+// window report switched on, and waits a minute for it to end. Without a program folder it looks beside itself;
+// a null value in changes removes that variable.
 ProgramOutcome RunProgram(
-    const TestEnvironment& environment, const QString& programFolder, const ProgramRunOptions& options = {});
+    const TestEnvironment& environment, const QString& programFolder, const QMap<QString, QString>& changes = {});
 
-// Starts the real service with the arguments in the calling process's environment and waits for it; the exit
-// code, or -1 when it did not end. Standard output and error, merged, go to output.
-int RunService(const QStringList& arguments, QString* output, int timeoutMs = 60000);
+// Starts the real service with the arguments in the calling process's environment and waits a minute for it;
+// the exit code, or -1 when it did not end. Standard output and error, merged, go to output.
+int RunService(const QStringList& arguments, QString* output);

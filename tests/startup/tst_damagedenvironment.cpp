@@ -1,7 +1,5 @@
-// Start-up of the real program when something it reads is damaged: the settings, their folder, the data
-// folders, the icon cache, the chosen language file, the component libraries and their registry. Each case
-// runs the program in a temporary tree and checks how it ended, what it said and that the user's files are
-// as they were.
+// The real program started in a temporary tree where something it reads is damaged: how it ended, what it
+// said, and that the user's files are as they were.
 #include "PeFixtures.h"
 #include "ProgramRun.h"
 #include "TestEnvironment.h"
@@ -21,12 +19,6 @@ using namespace Brimvault;
 using namespace Qt::StringLiterals;
 
 namespace {
-
-// Bytes no reader could take for text, with NULs and line ends spread through them.
-QByteArray garbage(qsizetype size)
-{
-    return RandomBytes(size, 20261121) + '\n';
-}
 
 // The entry at path and everything below it, as SnapshotTree shows them.
 QMap<QString, QByteArray> snapshotOf(const QString& path)
@@ -54,7 +46,10 @@ class TestDamagedEnvironment : public QObject {
     std::unique_ptr<TestEnvironment> m_env;
     std::unique_ptr<ProgramFolderCopy> m_program;
 
-    ProgramOutcome run(const ProgramRunOptions& options = {}) { return RunProgram(*m_env, m_program->path(), options); }
+    ProgramOutcome run(const QMap<QString, QString>& changes = {})
+    {
+        return RunProgram(*m_env, m_program->path(), changes);
+    }
 
     // Puts a damaged thing at path: "removed", "empty", "garbage", "text", "folder", "pipe", "link TARGET" (in
     // the tree), "truncated N" (the first N percent of `real`), or "intact".
@@ -70,7 +65,7 @@ class TestDamagedEnvironment : public QObject {
         if (how == u"text")
             return WriteFile(path, "\177ELF but nothing more\n");
         if (how == u"garbage")
-            return WriteFile(path, "MZ" + garbage(8192));
+            return WriteFile(path, "MZ" + RandomBytes(8192, 20261121));
         if (how == u"folder")
             return QDir().mkpath(path);
         if (how == u"pipe")
@@ -115,7 +110,6 @@ private Q_SLOTS:
         const QString lock = u"settings/Brimvault.ini.lock"_s;
         const QString intact = u"intact"_s;
         const QByteArray none;
-        QTest::newRow("folder in the file's place") << file << u"folder"_s << none << none << false;
         QTest::newRow("named pipe in the file's place") << file << u"pipe"_s << none << none << false;
         QTest::newRow("settings folder is a file") << u"settings"_s << u"text"_s << none << none << false;
         QTest::newRow("folder in the lock file's place") << lock << u"folder"_s << none << none << false;
@@ -123,14 +117,11 @@ private Q_SLOTS:
         // Kept elsewhere by the user (a folder of dotfiles, say): written through, the link stays.
         QTest::newRow("link to the user's own file")
             << file << u"link personal/dotfiles/Brimvault.ini"_s << none << none << true;
-        QTest::newRow("binary garbage before the sections") << file << intact << garbage(64 * 1024) << none << true;
-        QTest::newRow("NUL bytes inside a value")
-            << file << intact << none << QByteArray("[Settings]\nQuilletVersion=1") + '\0' + ".0\n"
-            << true;
+        // Random bytes: NULs, invalid UTF-8 and line ends spread through them.
+        QTest::newRow("binary garbage before the sections") << file << intact << RandomBytes(64 * 1024, 20261121) + '\n'
+                                                            << none << true;
         QTest::newRow("10 MB line") << file << intact << none << "; " + QByteArray(10 * 1024 * 1024, 'x') + '\n'
                                     << true;
-        QTest::newRow("invalid UTF-8") << file << intact << QByteArray("[FilesNames]\nFileName1=\xff\xfe\xc3(\x80\n")
-                                       << none << true;
         QTest::newRow("cut off in the middle of a line")
             << file << intact << none << QByteArray("[LocaleSettings]\nLngFileN") << true;
     }
@@ -166,71 +157,83 @@ private Q_SLOTS:
         QCOMPARE(GetSetting(AppTitle(), u"Settings"_s, u"CorvelleVersion"_s), QStringLiteral(BRIMVAULT_VERSION));
     }
 
-    void settingsFolderCannotBeMade_data()
+    // Without HOME and without a folder named, the settings go below XDG_CONFIG_HOME.
+    void settingsWithoutHome()
     {
-        QTest::addColumn<QString>("location"); // relative to the test's tree; empty: as the system gives it
-        QTest::addColumn<QStringList>("unset");
-        QTest::addColumn<QString>("expectedFile"); // where the settings must then be; empty: the program stops
-        QTest::newRow("below a regular file") << u"blocker/settings"_s << QStringList() << QString();
-        QTest::newRow("no HOME, folder given")
-            << u"settings"_s << QStringList {u"HOME"_s} << u"settings/Brimvault.ini"_s;
-        QTest::newRow("no HOME, only XDG_CONFIG_HOME")
-            << QString() << QStringList {u"HOME"_s, u"BRIMVAULT_SETTINGS_DIR"_s}
-            << u"xdg-config/Brimvault/Brimvault.ini"_s;
-    }
-    void settingsFolderCannotBeMade()
-    {
-        QFETCH(QString, location);
-        QFETCH(QString, expectedFile);
-        const QString blocker = m_env->path(u"blocker"_s);
-        QVERIFY(WriteFile(blocker, "the user's own file\n"));
-        ProgramRunOptions options;
-        QFETCH(QStringList, unset);
-        options.unsetEnvironment = unset;
-        if (!location.isEmpty())
-            options.setEnvironment.insert(u"BRIMVAULT_SETTINGS_DIR"_s, m_env->path(location));
+        QMap<QString, QString> changes {{u"HOME"_s, QString()}, {u"BRIMVAULT_SETTINGS_DIR"_s, QString()}};
         // Everything a program might derive from the home folder stays inside the tree.
         for (const QString& kind : {u"CONFIG"_s, u"DATA"_s, u"CACHE"_s, u"STATE"_s})
-            options.setEnvironment.insert(u"XDG_"_s + kind + u"_HOME"_s, m_env->path(u"xdg-"_s + kind.toLower()));
+            changes.insert(u"XDG_"_s + kind + u"_HOME"_s, m_env->path(u"xdg-"_s + kind.toLower()));
 
-        const ProgramOutcome outcome = run(options);
+        const ProgramOutcome outcome = run(changes);
 
-        QCOMPARE(ReadFile(blocker), QByteArray("the user's own file\n"));
-        if (expectedFile.isEmpty()) {
-            VERIFY_OUTCOME(outcome.stoppedWithAdminMessage() && !outcome.standardError.isEmpty(), outcome);
-            return;
-        }
         VERIFY_OUTCOME(outcome.showedWindow(), outcome);
-        QVERIFY(ReadFile(m_env->path(expectedFile)).contains("QuilletVersion=" BRIMVAULT_VERSION));
+        QVERIFY(ReadFile(m_env->path(u"xdg-config/Brimvault/Brimvault.ini"_s))
+                    .contains("QuilletVersion=" BRIMVAULT_VERSION));
     }
 
-    // The other games are still shown; installing a package tells why it cannot be done.
-    void gamesFolderIsNotAFolder_data()
+    // A game whose file, folder or icon cache is damaged is still listed, and the damaged thing stays as it
+    // was. Every queued icon is made once, from the executable when the cache cannot be used; without a games
+    // folder, installing a package tells why it cannot be done.
+    void gamesDamaged_data()
     {
-        QTest::addColumn<QString>("blocked"); // the path, relative to the tree, that is not a folder
+        QTest::addColumn<QString>("target"); // the game added by hand, its folders, the icons or Arcade's cache
         QTest::addColumn<QString>("damage");
+        for (const char* damage : {"removed", "empty", "garbage", "folder", "pipe"})
+            QTest::addRow("game file %s", damage) << u"game"_s << QString::fromLatin1(damage);
         QTest::newRow("games folder is a file") << u"commonappdata/Brimvault"_s << u"text"_s;
-        QTest::newRow("games folder is a named pipe") << u"commonappdata/Brimvault"_s << u"pipe"_s;
         QTest::newRow("application data folder is a file") << u"commonappdata"_s << u"text"_s;
+        QTest::newRow("icons folder is a file") << u"icons"_s << u"text"_s;
+        QTest::newRow("icons folder is a pipe") << u"icons"_s << u"pipe"_s;
+        QTest::newRow("icons folder links through a file") << u"icons"_s << u"link blocker/Icons"_s;
+        QTest::newRow("cache file is a pipe") << u"cache"_s << u"pipe"_s;
+        QTest::newRow("cache file is a folder") << u"cache"_s << u"folder"_s;
+        QTest::newRow("cache file is a link") << u"cache"_s << u"link personal/notes.txt"_s;
+        QTest::newRow("cache file is garbage") << u"cache"_s << u"garbage"_s;
     }
-    void gamesFolderIsNotAFolder()
+    void gamesDamaged()
     {
-        QFETCH(QString, blocked);
+        QFETCH(QString, target);
         QFETCH(QString, damage);
-        const QString blockedPath = m_env->path(blocked);
-        const QString added = userGame();
+        const QString game = userGame();
         const QString solitaire = m_env->path(u"windows/sol.exe"_s);
-        QVERIFY(spoil(blockedPath, damage) && WriteFile(m_env->settingsFile(), addedGameSettings(added))
-            && QFile::copy(PeFixture(u"nores32.exe"_s), solitaire));
-        const QMap<QString, QByteArray> untouched = snapshotOf(blockedPath);
+        const QString withIcon = DataFolders::GamesFolder() + u"Arcade/Arcade.exe"_s;
+        const QString withoutIcon = DataFolders::GamesFolder() + u"Plain/Plain.exe"_s;
+        const QString cacheFile = FileSystemPath(IconCacheFile(DataFolders::IconsFolder(), withIcon));
+        const QMap<QString, QString> targets {
+            {u"game"_s, game}, {u"cache"_s, cacheFile}, {u"icons"_s, QDir::cleanPath(DataFolders::IconsFolder())}};
+        const QString damaged = targets.value(target, m_env->path(target));
+        QVERIFY(WriteFile(withIcon, ReadFile(PeFixture(u"multi32.exe"_s)))
+            && WriteFile(withoutIcon, ReadFile(PeFixture(u"nores32.exe"_s)))
+            && QFile::copy(PeFixture(u"nores32.exe"_s), solitaire)
+            && WriteFile(m_env->settingsFile(), addedGameSettings(game))
+            && WriteFile(m_env->path(u"personal/notes.txt"_s), "my notes\n")
+            && WriteFile(m_env->path(u"blocker"_s), "a file\n") && spoil(damaged, damage));
+        const QMap<QString, QByteArray> untouched = snapshotOf(damaged);
+        const QMap<QString, QByteArray> personal = SnapshotTree(m_env->path(u"personal"_s));
+        const bool gamesFolder = targets.contains(target);
 
         const ProgramOutcome outcome = run();
 
+        VERIFY_OUTCOME(outcome.showedWindow(), outcome);
         const QStringList data = outcome.items(u"data"_s);
-        VERIFY_OUTCOME(outcome.showedWindow() && data.size() == 3, outcome);
-        VERIFY_OUTCOME(data.first().startsWith(u"http://127.0.0.1:9/"_s), outcome);
-        VERIFY_OUTCOME(data.contains(solitaire) && data.contains(added), outcome);
-
+        const QStringList pictures = outcome.items(u"picture"_s);
+        VERIFY_OUTCOME(data.size() == (gamesFolder ? 5 : 3) && data.first().startsWith(u"http://127.0.0.1:9/"_s)
+                && data.contains(solitaire),
+            outcome);
+        QCOMPARE(pictures.value(data.indexOf(game)), u"no-icon"_s);
+        QCOMPARE(outcome.items(u"caption"_s).value(data.indexOf(game)), u"chess"_s);
+        if (target == u"cache" && damage == u"garbage")
+            QVERIFY(ReadFile(cacheFile).startsWith(QByteArray("\0\0\1\0", 4)));
+        else
+            QCOMPARE(snapshotOf(damaged), untouched);
+        QCOMPARE(SnapshotTree(m_env->path(u"personal"_s)), personal);
+        if (gamesFolder) {
+            QCOMPARE(pictures.value(data.indexOf(withIcon)), u"picture"_s);
+            QCOMPARE(pictures.value(data.indexOf(withoutIcon)), u"no-icon"_s);
+            QVERIFY(!QFileInfo::exists(FileSystemPath(IconCacheFile(DataFolders::IconsFolder(), withoutIcon))));
+            return;
+        }
         const QString source = m_env->path(u"sources/Star Quest"_s);
         const QString package = m_env->path(u"StarQuest.bvxpak"_s);
         QString output;
@@ -238,73 +241,8 @@ private Q_SLOTS:
         QCOMPARE(RunService({u"--pack"_s, source, package}, &output), 0);
         QVERIFY2(
             RunService({u"-I"_s, package}, &output) > 0 && output.contains(u"cannot be created"_s), qPrintable(output));
-        QCOMPARE(snapshotOf(blockedPath), untouched);
+        QCOMPARE(snapshotOf(damaged), untouched);
         QCOMPARE(GetSetting(AppTitle(), u"Commands"_s, u"NewGameInstalled"_s, u"0"_s), u"0"_s);
-    }
-
-    // A game added by hand whose file is gone or damaged is still listed, with the no-icon picture.
-    void addedGameFileDamaged_data()
-    {
-        QTest::addColumn<QString>("damage");
-        for (const char* damage : {"removed", "empty", "garbage", "folder", "pipe"})
-            QTest::newRow(damage) << QString::fromLatin1(damage);
-    }
-    void addedGameFileDamaged()
-    {
-        QFETCH(QString, damage);
-        const QString game = userGame();
-        QVERIFY(spoil(game, damage) && WriteFile(m_env->settingsFile(), addedGameSettings(game)));
-        const QMap<QString, QByteArray> untouched = SnapshotTree(m_env->path(u"personal"_s));
-
-        const ProgramOutcome outcome = run();
-
-        VERIFY_OUTCOME(outcome.showedWindow(), outcome);
-        const qsizetype index = outcome.items(u"data"_s).indexOf(game);
-        QCOMPARE(outcome.items(u"picture"_s).value(index), u"no-icon"_s);
-        QCOMPARE(outcome.items(u"caption"_s).value(index), u"chess"_s);
-        QCOMPARE(SnapshotTree(m_env->path(u"personal"_s)), untouched);
-    }
-
-    // Every queued icon is made once, from the executable when the cache cannot be used, and the queue empties.
-    void iconCacheCannotBeWritten_data()
-    {
-        QTest::addColumn<bool>("folder"); // the icons folder damaged, else the arcade game's cache file
-        QTest::addColumn<QString>("damage");
-        QTest::newRow("folder is a file") << true << u"text"_s;
-        QTest::newRow("folder is a pipe") << true << u"pipe"_s;
-        QTest::newRow("folder links through a file") << true << u"link blocker/Icons"_s;
-        QTest::newRow("cache file is a pipe") << false << u"pipe"_s;
-        QTest::newRow("cache file is a folder") << false << u"folder"_s;
-        QTest::newRow("cache file is a link") << false << u"link personal/notes.txt"_s;
-        QTest::newRow("cache file is garbage") << false << u"garbage"_s;
-    }
-    void iconCacheCannotBeWritten()
-    {
-        QFETCH(bool, folder);
-        QFETCH(QString, damage);
-        const QString withIcon = DataFolders::GamesFolder() + u"Arcade/Arcade.exe"_s;
-        const QString withoutIcon = DataFolders::GamesFolder() + u"Plain/Plain.exe"_s;
-        const QString icons = QDir::cleanPath(DataFolders::IconsFolder());
-        const QString cacheFile = FileSystemPath(IconCacheFile(DataFolders::IconsFolder(), withIcon));
-        const QString notes = m_env->path(u"personal/notes.txt"_s);
-        QVERIFY(WriteFile(withIcon, ReadFile(PeFixture(u"multi32.exe"_s)))
-            && WriteFile(withoutIcon, ReadFile(PeFixture(u"nores32.exe"_s))) && WriteFile(notes, "my notes\n")
-            && WriteFile(m_env->path(u"blocker"_s), "a file\n") && spoil(folder ? icons : cacheFile, damage));
-        const QMap<QString, QByteArray> untouched = snapshotOf(icons);
-
-        const ProgramOutcome outcome = run();
-
-        VERIFY_OUTCOME(outcome.showedWindow(), outcome);
-        const QStringList data = outcome.items(u"data"_s);
-        const QStringList pictures = outcome.items(u"picture"_s);
-        QCOMPARE(pictures.value(data.indexOf(withIcon)), u"picture"_s);
-        QCOMPARE(pictures.value(data.indexOf(withoutIcon)), u"no-icon"_s);
-        if (damage == u"garbage")
-            QVERIFY(ReadFile(cacheFile).startsWith(QByteArray("\0\0\1\0", 4)));
-        else
-            QCOMPARE(snapshotOf(icons), untouched);
-        QCOMPARE(ReadFile(notes), QByteArray("my notes\n"));
-        QVERIFY(!QFileInfo::exists(FileSystemPath(IconCacheFile(DataFolders::IconsFolder(), withoutIcon))));
     }
 
     // The stored language applies when its file is usable; otherwise the built-in English texts, silently, and
@@ -312,8 +250,7 @@ private Q_SLOTS:
     void chosenLanguageFileDamaged_data()
     {
         QTest::addColumn<QString>("damage");
-        for (const char* damage :
-            {"intact", "removed", "empty", "garbage", "folder", "pipe", "repeated number", "no charset", "huge"})
+        for (const char* damage : {"intact", "removed", "empty", "garbage", "folder", "pipe", "huge"})
             QTest::newRow(damage) << QString::fromLatin1(damage);
     }
     void chosenLanguageFileDamaged()
@@ -324,12 +261,7 @@ private Q_SLOTS:
         QVERIFY(SaveSetting(AppTitle(), u"LocaleSettings"_s, u"LngFileName"_s, u"Brimvault_Russian.lng"_s)
             && SaveSetting(AppTitle(), u"LocaleSettings"_s, u"LngNik"_s, u"RUSSIAN"_s));
         const QString file = m_program->filePath(u"Brimvault_Russian.lng"_s);
-        const QByteArray russian = ReadFile(file);
-        if (damage == u"repeated number")
-            QVERIFY(WriteFile(file, russian + "\r\n@1010=\xc4\xe5\xe9\xf1\xf2\xe2\xe8\xff\r\n"));
-        else if (damage == u"no charset")
-            QVERIFY(WriteFile(file, QByteArray(russian).replace("#charset=204", "; no charset")));
-        else if (damage == u"huge")
+        if (damage == u"huge")
             QVERIFY(WriteFile(file, "#language=Russian\r\n#charset=204\r\n" + QByteArray(17 * 1024 * 1024, ';')));
         else
             QVERIFY(spoil(file, damage));
@@ -340,9 +272,7 @@ private Q_SLOTS:
         VERIFY_OUTCOME(outcome.showedWindow(), outcome);
         const bool english = damage != u"intact";
         QCOMPARE(outcome.window->value(u"actions"_s).toString() == u"Actions"_s, english);
-        QCOMPARE(outcome.items(u"caption"_s).value(0) == u"Online games"_s, english);
         QCOMPARE(outcome.window->value(u"menu"_s).toArray().contains(u"Add game file..."_s), english);
-        QCOMPARE(outcome.window->value(u"title"_s).toString(), u"Brimvault"_s);
         QCOMPARE(SnapshotTree(m_env->path(u"settings"_s)), settingsBefore);
     }
 

@@ -1,18 +1,27 @@
-// Start-up in process: the five components checked in order, registered when needed, their versions stored.
+// Start-up: the command line, the message and input boxes (as widgets and as the prompt log that lets tests watch
+// the real program), and the five components checked in order, registered when needed, their versions stored.
+#include "MainWindowFixture.h"
 #include "ProgramRun.h"
 #include "PromptRecorder.h"
 #include "TestEnvironment.h"
 #include "TestFiles.h"
-#include "TestSuite.h"
 
 #include "app/CompanionComponents.h"
 #include "app/ComponentRegistry.h"
+#include "app/startup/CommandLine.h"
+#include "app/startup/TestHooks.h"
+#include "app/startup/WidgetPrompts.h"
 #include "app/startup/modMain.h"
 #include "store/SettingsStore.h"
+#include "support/UserPrompt.h"
 #include "ui/main/frmMain.h"
 
+#include <QAbstractButton>
 #include <QApplication>
+#include <QInputDialog>
+#include <QMessageBox>
 #include <QPointer>
+#include <QProcess>
 #include <QtTest>
 
 #include <sys/stat.h>
@@ -20,7 +29,21 @@
 using namespace Brimvault;
 using namespace Qt::StringLiterals;
 
+Q_DECLARE_METATYPE(Brimvault::PromptIcon)
+Q_DECLARE_METATYPE(Brimvault::PromptButtons)
+Q_DECLARE_METATYPE(Brimvault::PromptAnswer)
+
 namespace {
+
+const QString Usage = u"Usage: brimvault [OPTION [ARGUMENTS]]\n"
+                      "Without an option the program starts its window.\n\n"
+                      "  --help                       show this help\n"
+                      "  --version                    show the program's version\n"
+                      "  --extract-icon FILE OUT.ico  write the main icon of an executable as an icon file\n"
+                      "  --version-info FILE          print the version information of an executable\n"
+                      "  --list [--json] [--find TEXT] [--order found|name|recent]\n"
+                      "                               print the games as the window lists them, without writing "
+                      "anything\n"_s;
 
 const QStringList Prefixes {u"Quillet"_s, u"Tamarisk"_s, u"Velloran"_s, u"Ostrane"_s, u"Corvelle"_s};
 
@@ -69,6 +92,9 @@ private Q_SLOTS:
     // A window takes its menus with it: each top-level widget is deleted once, if it is still there.
     void cleanup()
     {
+        SetPromptHandler({});
+        SetInputHandler({});
+        qunsetenv("BRIMVAULT_PROMPT_LOG");
         QList<QPointer<QWidget>> windows;
         for (QWidget* widget : QApplication::topLevelWidgets())
             windows << widget;
@@ -76,46 +102,194 @@ private Q_SLOTS:
             delete window.data();
     }
 
-    void firstRunRegistersAllAndShowsWindow()
+    void needsNoDisplay_data()
     {
-        TestEnvironment env;
-        PromptRecorder prompts;
-        QVERIFY(addComponents(env));
-        modMain::Main();
-        for (const QString& prefix : Prefixes) {
-            QCOMPARE(savedVersion(prefix), QStringLiteral(BRIMVAULT_VERSION));
-            QCOMPARE(
-                RegisteredLibrary(prefix + u".clsVersion"_s), env.programDir() + u'/' + CompanionComponentFile(prefix));
-        }
-        QCOMPARE(GetAllSettings(AppTitle(), u"Settings"_s).size(), 5);
-        QVERIFY(prompts.prompts.isEmpty());
-        QCOMPARE(visibleMainWindows(), 1);
-        modMain::Main();
-        QCOMPARE(visibleMainWindows(), 1);
+        QTest::addColumn<QStringList>("arguments");
+        QTest::addColumn<bool>("noDisplay");
+        QTest::newRow("no arguments") << QStringList() << false;
+        QTest::newRow("command") << QStringList {u"--version"_s} << true;
+        QTest::newRow("unknown option") << QStringList {u"--bogus"_s} << true;
+        QTest::newRow("plain word") << QStringList {u"game.exe"_s} << true;
+        QTest::newRow("Qt option, one dash") << QStringList {u"-style"_s, u"fusion"_s} << false;
+        QTest::newRow("Qt option, two dashes") << QStringList {u"--platform"_s, u"xcb"_s} << false;
+        QTest::newRow("Qt option with value") << QStringList {u"--style=fusion"_s} << false;
+    }
+    void needsNoDisplay()
+    {
+        QFETCH(QStringList, arguments);
+        QList<QByteArray> storage {"brimvault"};
+        for (const QString& argument : arguments)
+            storage.append(argument.toLocal8Bit());
+        std::vector<const char*> argv;
+        for (const QByteArray& argument : storage)
+            argv.push_back(argument.constData());
+        QTEST(CommandLine::NeedsNoDisplay(int(argv.size()), argv.data()), "noDisplay");
     }
 
-    void failingComponentStopsStartup_data()
+    void realProgram_data()
     {
-        QTest::addColumn<QString>("velloran");
-        for (const char* kind : {"RegisterFails", "RegistersNothing", "NoGetVersion"})
-            QTest::newRow(kind) << QString::fromLatin1(kind);
+        QTest::addColumn<QStringList>("arguments");
+        QTest::addColumn<int>("exitCode");
+        QTest::addColumn<QString>("out"); // the whole standard output
+        QTest::addColumn<QString>("err"); // the complaint, followed by the usage
+
+        QTest::newRow("version") << QStringList {u"--version"_s} << 0 << u"Brimvault " BRIMVAULT_VERSION "\n"_s
+                                 << QString();
+        QTest::newRow("help") << QStringList {u"--help"_s} << 0 << Usage << QString();
+        QTest::newRow("unknown option") << QStringList {u"--bogus"_s} << 2 << QString() << u"Unknown option: --bogus"_s;
+        QTest::newRow("option in the wrong case")
+            << QStringList {u"--HELP"_s} << 2 << QString() << u"Unknown option: --HELP"_s;
+        QTest::newRow("too many arguments")
+            << QStringList {u"--version"_s, u"x"_s} << 2 << QString() << u"Wrong number of arguments for --version"_s;
+        QTest::newRow("too few arguments") << QStringList {u"--extract-icon"_s, u"a.exe"_s} << 2 << QString()
+                                           << u"Wrong number of arguments for --extract-icon"_s;
     }
-    void failingComponentStopsStartup()
+    // Run with no display and no platform chosen: a command must still work, and writes nothing.
+    void realProgram()
+    {
+        QFETCH(QStringList, arguments);
+        QFETCH(QString, err);
+        TestEnvironment env;
+        QProcessEnvironment environment = QProcessEnvironment::systemEnvironment();
+        for (const char* name : {"QT_QPA_PLATFORM", "DISPLAY", "WAYLAND_DISPLAY"})
+            environment.remove(QString::fromLatin1(name));
+        QProcess program;
+        program.setProcessEnvironment(environment);
+        program.start(QStringLiteral(BRIMVAULT_BIN_DIR "/brimvault"), arguments);
+        QVERIFY(program.waitForFinished(20000));
+        QCOMPARE(program.exitStatus(), QProcess::NormalExit);
+        QTEST(program.exitCode(), "exitCode");
+        QTEST(QString::fromLocal8Bit(program.readAllStandardOutput()), "out");
+        const QString complaint = QString::fromLocal8Bit(program.readAllStandardError());
+        QVERIFY2(err.isEmpty() ? !complaint.contains(u"Usage") : complaint.endsWith(err + u'\n' + Usage),
+            qPrintable(complaint));
+        QVERIFY(!QFileInfo::exists(env.settingsFile()));
+    }
+
+    // Every box is written down and answered with the button that does not go ahead.
+    void promptLog()
+    {
+        TestEnvironment env;
+        const QString log = env.path(u"prompts.jsonl"_s);
+        QVERIFY(!TestHooks::InstallPromptLogIfRequested());
+        qputenv("BRIMVAULT_PROMPT_LOG", log.toLocal8Bit());
+        QVERIFY(TestHooks::InstallPromptLogIfRequested());
+        const QList<PromptAnswer> answers {
+            ShowPrompt({u"Remove Chess?\nReally?"_s, u"Brimvault"_s, PromptIcon::Critical, PromptButtons::Ok}),
+            ShowPrompt({u"b"_s, u"t"_s, PromptIcon::Exclamation, PromptButtons::OkCancel}),
+            ShowPrompt({u"c"_s, u"t"_s, PromptIcon::Question, PromptButtons::YesNo}),
+            ShowPrompt({u"d"_s, u"t"_s, PromptIcon::None, PromptButtons::YesNoCancel})};
+        QCOMPARE(answers, QList({PromptAnswer::Ok, PromptAnswer::Cancel, PromptAnswer::No, PromptAnswer::Cancel}));
+        QCOMPARE(AskInput({u"Edit game name"_s, u"Brimvault"_s, u"Chess"_s}), std::nullopt);
+        // Written with ' for " here.
+        const QByteArrayList logged {
+            "{'buttons':'ok','icon':'critical','kind':'message','text':'Remove Chess?\\nReally?','title':'Brimvault'}",
+            "{'buttons':'okcancel','icon':'exclamation','kind':'message','text':'b','title':'t'}",
+            "{'buttons':'yesno','icon':'question','kind':'message','text':'c','title':'t'}",
+            "{'buttons':'yesnocancel','icon':'none','kind':'message','text':'d','title':'t'}",
+            "{'kind':'input','text':'Edit game name','title':'Brimvault'}"};
+        QCOMPARE(ReadFile(log), logged.join('\n').replace('\'', '"') + '\n');
+    }
+
+    void messageBox_data()
+    {
+        QTest::addColumn<PromptIcon>("icon");
+        QTest::addColumn<PromptButtons>("buttons");
+        QTest::addColumn<int>("click"); // a QMessageBox::StandardButton, or 0 for Escape
+        QTest::addColumn<int>("shownIcon");
+        QTest::addColumn<PromptAnswer>("answer");
+        QTest::newRow("critical, OK") << PromptIcon::Critical << PromptButtons::Ok << int(QMessageBox::Ok)
+                                      << int(QMessageBox::Critical) << PromptAnswer::Ok;
+        QTest::newRow("question, yes") << PromptIcon::Question << PromptButtons::YesNo << int(QMessageBox::Yes)
+                                       << int(QMessageBox::Question) << PromptAnswer::Yes;
+        QTest::newRow("question, escape means no")
+            << PromptIcon::Question << PromptButtons::YesNo << 0 << int(QMessageBox::Question) << PromptAnswer::No;
+        QTest::newRow("exclamation, cancel")
+            << PromptIcon::Exclamation << PromptButtons::OkCancel << int(QMessageBox::Cancel)
+            << int(QMessageBox::Warning) << PromptAnswer::Cancel;
+        QTest::newRow("information, no of three")
+            << PromptIcon::Information << PromptButtons::YesNoCancel << int(QMessageBox::No)
+            << int(QMessageBox::Information) << PromptAnswer::No;
+        QTest::newRow("escape of three cancels")
+            << PromptIcon::None << PromptButtons::YesNoCancel << 0 << int(QMessageBox::NoIcon) << PromptAnswer::Cancel;
+    }
+    void messageBox()
+    {
+        QFETCH(PromptIcon, icon);
+        QFETCH(PromptButtons, buttons);
+        QFETCH(int, click);
+        InstallWidgetPrompts();
+        QStringList seen;
+        WhenModalShows([&](QWidget* widget) {
+            auto* box = qobject_cast<QMessageBox*>(widget);
+            QVERIFY(box);
+            seen << box->text() << box->windowTitle() << QString::number(box->icon());
+            if (click == 0)
+                QTest::keyClick(box, Qt::Key_Escape);
+            else
+                box->button(QMessageBox::StandardButton(click))->click();
+        });
+        QTEST(ShowPrompt({u"Remove the game?"_s, u"Brimvault"_s, icon, buttons}), "answer");
+        QFETCH(int, shownIcon);
+        QCOMPARE(seen, QStringList({u"Remove the game?"_s, u"Brimvault"_s, QString::number(shownIcon)}));
+    }
+
+    void inputBox_data()
+    {
+        QTest::addColumn<bool>("accept");
+        QTest::addColumn<QString>("typed");
+        QTest::newRow("accepted with new text") << true << u"Solitaire"_s;
+        QTest::newRow("accepted empty") << true << QString();
+        QTest::newRow("cancelled") << false << u"ignored"_s;
+    }
+    void inputBox()
+    {
+        QFETCH(bool, accept);
+        QFETCH(QString, typed);
+        InstallWidgetPrompts();
+        QString seenDefault;
+        WhenModalShows([&](QWidget* widget) {
+            auto* dialog = qobject_cast<QInputDialog*>(widget);
+            QVERIFY(dialog);
+            seenDefault = dialog->textValue();
+            dialog->setTextValue(typed);
+            accept ? dialog->accept() : dialog->reject();
+        });
+        const std::optional<QString> result = AskInput({u"New name:"_s, u"Rename"_s, u"Old name"_s});
+        QCOMPARE(seenDefault, u"Old name"_s);
+        QCOMPARE(result, accept ? std::optional<QString>(typed) : std::nullopt);
+    }
+
+    // The components are checked in order: the first that fails stops start-up with the one message, and those
+    // after it are never registered, let alone loaded. A second start opens no second window.
+    void componentsCheckedInOrder_data()
+    {
+        QTest::addColumn<QString>("velloran"); // the stand-in for Velloran; empty: the real one
+        QTest::addColumn<int>("usable"); // how many components, from the first, end up usable
+        QTest::newRow("all real") << QString() << 5;
+        for (const char* kind : {"RegisterFails", "RegistersNothing", "NoGetVersion"})
+            QTest::newRow(kind) << QString::fromLatin1(kind) << 2;
+    }
+    void componentsCheckedInOrder()
     {
         QFETCH(QString, velloran);
+        QFETCH(int, usable);
         TestEnvironment env;
         PromptRecorder prompts;
         QVERIFY(addComponents(env, u"Velloran"_s, velloran));
         modMain::Main();
-        QCOMPARE(prompts.texts(), QStringList {u"You need to run the program as administrator!"_s});
-        QCOMPARE(visibleMainWindows(), 0);
-        const QString v = QStringLiteral(BRIMVAULT_VERSION);
-        const QStringList versions {v, v, u"-"_s, u"-"_s, u"-"_s};
-        for (qsizetype i = 0; i < Prefixes.size(); ++i)
-            QCOMPARE(savedVersion(Prefixes[i]), versions[i]);
-        // The components after the failing one were never registered, let alone loaded.
-        QVERIFY(RegisteredLibrary(u"Ostrane.clsVersion"_s).isEmpty());
-        QVERIFY(RegisteredLibrary(u"Corvelle.clsVersion"_s).isEmpty());
+        for (int i = 0; i < Prefixes.size(); ++i) {
+            const bool ok = i < usable;
+            QCOMPARE(savedVersion(Prefixes[i]), ok ? QStringLiteral(BRIMVAULT_VERSION) : u"-"_s);
+            if (i != usable) // the failing one may or may not have registered itself
+                QCOMPARE(RegisteredLibrary(Prefixes[i] + u".clsVersion"_s),
+                    ok ? env.programDir() + u'/' + CompanionComponentFile(Prefixes[i]) : QString());
+        }
+        QCOMPARE(GetAllSettings(AppTitle(), u"Settings"_s).size(), usable);
+        const QStringList message {u"You need to run the program as administrator!"_s};
+        QCOMPARE(prompts.texts(), usable == 5 ? QStringList() : message);
+        modMain::Main();
+        QCOMPARE(visibleMainWindows(), usable == 5 ? 1 : 0);
     }
 
     void versionComparison_data()
@@ -125,7 +299,6 @@ private Q_SLOTS:
         QTest::addColumn<bool>("written");
         QTest::newRow("unchanged") << u"1.0.0"_s << u"1.0.0"_s << false;
         QTest::newRow("differs only in case") << u"2.0.0-beta"_s << u"2.0.0-Beta"_s << true;
-        QTest::newRow("saved is newer") << u"9.9.9"_s << u"1.0.0"_s << true;
         QTest::newRow("trailing space") << u"1.0.0 "_s << u"1.0.0"_s << true;
         QTest::newRow("never saved") << QString() << u"1.0.0"_s << true;
         QTest::newRow("empty version, never saved") << QString() << QString() << false;
@@ -159,42 +332,16 @@ private Q_SLOTS:
         QCOMPARE(stampOf(ComponentRegistryPath()), registryBefore);
     }
 
-    void registerComponent_data()
-    {
-        QTest::addColumn<QString>("prefix");
-        QTest::addColumn<QString>("kind"); // the stand-in in the program folder for Velloran
-        QTest::addColumn<int>("status");
-        QTest::addColumn<bool>("registered");
-        QTest::newRow("real component") << u"Quillet"_s << QString() << 0 << true;
-        QTest::newRow("prefix matched without case") << u"oSTRANE"_s << QString() << 0 << true;
-        QTest::newRow("refusing component") << u"Velloran"_s << u"RegisterFails"_s << int(0x80070005) << false;
-        QTest::newRow("unknown prefix does nothing") << u"Nobody"_s << QString() << 0 << false;
-    }
-    void registerComponent()
-    {
-        QFETCH(QString, prefix);
-        QFETCH(QString, kind);
-        QFETCH(bool, registered);
-        TestEnvironment env;
-        QVERIFY(addComponents(env, u"Velloran"_s, kind));
-        QTEST(modMain::RegisterComponent(prefix), "status");
-        QCOMPARE(RegisteredLibrary(prefix + u".clsVersion"_s),
-            registered ? env.programDir() + u'/' + CompanionComponentFile(prefix) : QString());
-        QCOMPARE(QFileInfo::exists(ComponentRegistryPath()), registered);
-    }
-
     // Without a program folder named, the program finds its components beside itself.
     void realProgramFindsItsComponents()
     {
         TestEnvironment env;
-        ProgramRunOptions options;
-        options.unsetEnvironment = QStringList {u"BRIMVAULT_PROGRAM_DIR"_s};
-        const ProgramOutcome outcome = RunProgram(env, QString(), options);
+        const ProgramOutcome outcome = RunProgram(env, QString());
         QVERIFY2(outcome.showedWindow(), qPrintable(outcome.describe()));
         for (const QString& prefix : Prefixes)
             QCOMPARE(savedVersion(prefix), QStringLiteral(BRIMVAULT_VERSION));
     }
 };
 
-BV_REGISTER_TEST(TestStartup);
+QTEST_MAIN(TestStartup)
 #include "tst_startup.moc"
