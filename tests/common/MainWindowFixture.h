@@ -68,8 +68,7 @@ std::unique_ptr<Window> OpenFilledWindow()
 QString SampleCaption(int i);
 QString SamplePath(int i);
 
-// An icon list `usableWidth` pixels wide beside its scroll bar holding `items` sample games, shown with the
-// keyboard focus.
+// An icon list `usableWidth` wide beside its scroll bar, holding `items` sample games, shown with the focus.
 template <class List>
 std::unique_ptr<List> ShownList(int usableWidth, int height, int items)
 {

@@ -93,8 +93,8 @@ private Q_SLOTS:
         QTest::addColumn<QList<float>>("lefts");
         QTest::addColumn<QList<double>>("rowTops");
         QTest::addColumn<int>("maxColumns");
-        const QList<float> threeARow {24, 104, 184, 24, 104, 184, 24};
-        QTest::newRow("a row that exactly fits") << 240.0 << threeARow << QList<double> {0, 109, 204} << 3;
+        QTest::newRow("a row that exactly fits")
+            << 240.0 << QList<float> {24, 104, 184, 24, 104, 184, 24} << QList<double> {0, 109, 204} << 3;
         QTest::newRow("one pixel short") << 239.0 << QList<float> {24, 104, 24, 104, 24, 104, 24}
                                          << QList<double> {0, 109, 190, 285} << 2;
         QTest::newRow("below one cell, the first wraps too")

@@ -12,6 +12,7 @@
 #include "ui/main/frmMain.h"
 
 #include <QAction>
+#include <QJsonArray>
 #include <QJsonDocument>
 #include <QLineEdit>
 #include <QMimeData>

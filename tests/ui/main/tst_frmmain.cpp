@@ -3,6 +3,7 @@
 #include "PromptRecorder.h"
 #include "TestEnvironment.h"
 
+#include "i18n/ApplyLanguage.h"
 #include "i18n/frmLanguages.h"
 #include "i18n/modLocalizer.h"
 #include "store/SettingsStore.h"

@@ -32,12 +32,7 @@ class TestKeyboardOnly : public QObject {
 
     void press(const QString& keys)
     {
-        if (keys == u"screen reader"_s) {
-            QAccessibleInterface* button = QAccessible::queryAccessibleInterface(m_window->imgActions());
-            QCOMPARE(QStringList({QString::number(button->role()), button->text(QAccessible::Name)}),
-                QStringList({QString::number(QAccessible::Button), u"Actions"_s}));
-            button->actionInterface()->doAction(QAccessibleActionInterface::pressAction());
-        } else if (keys.startsWith(u"Alt"_s)) {
+        if (keys.startsWith(u"Alt"_s)) {
             QKeyEvent altDown(QEvent::KeyPress, Qt::Key_Alt, Qt::AltModifier);
             QApplication::sendEvent(list(), &altDown);
             if (keys == u"Alt+Left"_s)
@@ -80,7 +75,6 @@ private Q_SLOTS:
         QTest::addColumn<QStringList>("commands");
         QTest::newRow("F10") << u"F10"_s << actions;
         QTest::newRow("Alt alone") << u"Alt"_s << actions;
-        QTest::newRow("screen reader presses Actions") << u"screen reader"_s << actions;
         QTest::newRow("Alt with an arrow") << u"Alt+Left"_s << QStringList();
         QTest::newRow("Shift+F10") << u"Shift+F10"_s << item;
         QTest::newRow("menu key") << u"Menu"_s << item;
@@ -131,6 +125,16 @@ private Q_SLOTS:
         QVERIFY(rebuilt.count() > 0 || rebuilt.wait(10000));
         QCOMPARE(seenTitle, u"Program language"_s);
         QVERIFY(comboHadFocus);
+    }
+
+    // A screen reader finds the Actions button by its caption and presses it.
+    void actionsButtonIsNamedAndPressable()
+    {
+        QAccessibleInterface* button = QAccessible::queryAccessibleInterface(m_window->imgActions());
+        QCOMPARE(button->role(), QAccessible::Button);
+        QCOMPARE(button->text(QAccessible::Name), u"Actions"_s);
+        button->actionInterface()->doAction(QAccessibleActionInterface::pressAction());
+        QVERIFY(m_window->mnuActions()->isVisible());
     }
 };
 
