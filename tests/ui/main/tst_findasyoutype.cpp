@@ -55,6 +55,8 @@ class TestFindAsYouType : public QObject {
     {
         QMimeData mime;
         mime.setUrls({QUrl::fromLocalFile(file)});
+        QDragEnterEvent enter(QPoint(40, 40), Qt::CopyAction, &mime, Qt::LeftButton, Qt::NoModifier);
+        QApplication::sendEvent(list(), &enter);
         QDropEvent dropped(QPointF(40, 40), Qt::CopyAction, &mime, Qt::LeftButton, Qt::NoModifier);
         QApplication::sendEvent(list(), &dropped);
     }
