@@ -18,14 +18,9 @@ inline QList<TestFactory>& RegisteredTests()
     return tests;
 }
 
-template <class Test>
-bool RegisterTest()
-{
-    RegisteredTests().append([] { return std::make_unique<Test>(); });
-    return true;
-}
-
-#define BV_REGISTER_TEST(Class) static const bool registered##Class = RegisterTest<Class>()
+#define BV_REGISTER_TEST(Class)                                                                                        \
+    static const bool registered##Class                                                                                \
+        = (RegisteredTests().append([] { return std::unique_ptr<QObject>(new Class); }), true)
 
 inline int RunRegisteredTests(int argc, char** argv)
 {

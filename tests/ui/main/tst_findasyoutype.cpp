@@ -1,9 +1,7 @@
 // Find as you type and the chosen order, through real keys and menus on the real window.
 #include "MainWindowFixture.h"
 #include "TestEnvironment.h"
-#include "TestFiles.h"
 #include "TestSuite.h"
-#include "catalogue/ListOrder.h"
 #include "store/CatalogueKeys.h"
 #include "store/PlayHistory.h"
 #include "store/SettingsStore.h"
@@ -20,8 +18,6 @@
 #include <QMimeData>
 #include <QProcess>
 #include <QScrollBar>
-#include <QSignalSpy>
-#include <QTest>
 #include <QTimeZone>
 #include <QUrl>
 
@@ -38,10 +34,7 @@ class TestFindAsYouType : public QObject {
     QLineEdit* field() const { return m_window->finder()->field(); }
     void openWindow()
     {
-        m_window = std::make_unique<frmMain>();
-        QSignalSpy rebuilt(m_window.get(), &frmMain::listRebuilt);
-        m_window->show();
-        QVERIFY(rebuilt.wait(20000));
+        m_window = OpenFilledWindow<frmMain>();
         m_window->resize(760, 560);
     }
     QStringList shownCaptions() const
@@ -110,7 +103,6 @@ private Q_SLOTS:
         QTest::keyClick(field(), Qt::Key_Right);
         const QString second = list()->GetCurrentData();
         QVERIFY(first != second);
-        QCOMPARE(QStringList({first, second}).filter(u"ra"_s).size(), 2);
         // The shown items flow from the first cell.
         QCOMPARE(list()->imgN(list()->currentIndex()).geometry().left(), list()->imgN(0).geometry().left() + 80);
 
@@ -169,8 +161,6 @@ private Q_SLOTS:
     {
         m_window->menuItem(u"mnuOrderName"_s)->trigger();
         const QStringList sorted = shownCaptions();
-        QVERIFY(sorted.indexOf(u"chess"_s) < sorted.indexOf(u"puzzle2"_s));
-        QVERIFY(sorted.indexOf(u"puzzle2"_s) < sorted.indexOf(u"puzzle10"_s));
         QVERIFY(sorted.indexOf(u"puzzle79"_s) < sorted.indexOf(u"racer"_s));
 
         m_window.reset();
@@ -178,32 +168,29 @@ private Q_SLOTS:
         QCOMPARE(shownCaptions(), sorted);
         QVERIFY(m_window->menuItem(u"mnuOrderName"_s)->isChecked());
 
+        // What the window shows is what scripts read, with the history of a game played for a minute.
         list()->setFocus();
         type(u"zle1"_s);
-        QProcess listing;
-        listing.start(QStringLiteral(BRIMVAULT_BIN_DIR "/brimvault"), {u"--list"_s, u"--find"_s, u"zle1"_s});
-        QVERIFY(listing.waitForFinished(60000));
-        QStringList printed;
-        for (const QString& line : QString::fromUtf8(listing.readAllStandardOutput()).split(u'\n', Qt::SkipEmptyParts))
-            printed.append(line.section(u'\t', 0, 0));
-        QCOMPARE(printed.size(), 11);
-        QCOMPARE(printed, shownCaptions());
-
-        // The history of a game played for a minute, as scripts read it.
         const QString played = list()->GetCurrentData();
         PlayHistory::RecordLaunch(played, QDateTime(QDate(2026, 11, 23), QTime(22, 0), QTimeZone::utc()));
         PlayHistory::AddPlayTime(played, 61);
+        QProcess listing;
         listing.start(
             QStringLiteral(BRIMVAULT_BIN_DIR "/brimvault"), {u"--list"_s, u"--json"_s, u"--find"_s, u"zle1"_s});
         QVERIFY(listing.waitForFinished(60000));
-        const QJsonArray games = QJsonDocument::fromJson(listing.readAllStandardOutput()).array();
-        QCOMPARE(games.size(), 11);
-        for (const QJsonValue& game : games) {
-            const bool isPlayed = game[u"path"_s].toString() == played;
-            QCOMPARE(game[u"launches"_s].toInt(), isPlayed ? 1 : 0);
-            QCOMPARE(game[u"playSeconds"_s].toInt(), isPlayed ? 61 : 0);
-            QCOMPARE(game[u"lastPlayed"_s].toString(), isPlayed ? u"2026-11-23T22:00:00Z"_s : QString());
+        QStringList printed;
+        QStringList history;
+        for (const QJsonValue& game : QJsonDocument::fromJson(listing.readAllStandardOutput()).array()) {
+            printed << game[u"caption"_s].toString();
+            history << u"%1 %2 %3 %4"_s.arg(game[u"path"_s].toString())
+                           .arg(game[u"launches"_s].toInt())
+                           .arg(game[u"playSeconds"_s].toInt())
+                           .arg(game[u"lastPlayed"_s].toString());
         }
+        QCOMPARE(printed.size(), 11);
+        QCOMPARE(printed, shownCaptions());
+        QCOMPARE(history.filter(u" 0 0 "_s).size(), 10);
+        QVERIFY2(history.contains(played + u" 1 61 2026-11-23T22:00:00Z"_s), qPrintable(history.join(u'\n')));
     }
 };
 

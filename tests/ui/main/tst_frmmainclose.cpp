@@ -1,5 +1,6 @@
 // Closing the main window: the advertisement that is due shows, except when the session is ending.
 #include "AdvertisingFiles.h"
+#include "MainWindowFixture.h"
 #include "TestEnvironment.h"
 #include "media/WebEngineStartup.h"
 #include "media/frmReclama.h"
@@ -9,8 +10,6 @@
 #include <QApplication>
 #include <QPointer>
 #include <QSessionManager>
-#include <QSignalSpy>
-#include <QTest>
 
 using namespace Brimvault;
 
@@ -31,11 +30,8 @@ private Q_SLOTS:
         QFETCH(bool, sessionEnds);
         QVERIFY(
             WriteDueAdvertisement(DataFolders::ReclamaFolder(), QStringLiteral("http://ads.example"), Qt::darkCyan));
-        QPointer<frmMain> window = new frmMain;
+        QPointer<frmMain> window = OpenFilledWindow<frmMain>().release();
         window->setAttribute(Qt::WA_DeleteOnClose);
-        QSignalSpy rebuilt(window.data(), &frmMain::listRebuilt);
-        window->show();
-        QVERIFY(rebuilt.wait(10000));
         if (sessionEnds) {
             // The session manager's own request, as the platform delivers it when the user logs out.
             auto* manager = qApp->findChild<QSessionManager*>();

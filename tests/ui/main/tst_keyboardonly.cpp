@@ -16,25 +16,9 @@
 #include <QComboBox>
 #include <QKeyEvent>
 #include <QMenu>
-#include <QSignalSpy>
-#include <QTest>
 
 using namespace Brimvault;
 using namespace Qt::StringLiterals;
-
-namespace {
-
-QStringList activeActionsWalkingDown(QMenu* menu)
-{
-    QStringList seen;
-    while (menu->activeAction() && !seen.contains(menu->activeAction()->objectName())) {
-        seen << menu->activeAction()->objectName();
-        QTest::keyClick(menu, Qt::Key_Down);
-    }
-    return seen;
-}
-
-} // namespace
 
 class TestKeyboardOnly : public QObject {
     Q_OBJECT
@@ -66,10 +50,7 @@ private Q_SLOTS:
 
     void init()
     {
-        m_window = std::make_unique<frmMain>();
-        QSignalSpy rebuilt(m_window.get(), &frmMain::listRebuilt);
-        m_window->show();
-        QVERIFY(rebuilt.wait(10000));
+        m_window = OpenFilledWindow<frmMain>();
         m_window->activateWindow();
         QVERIFY(QTest::qWaitForWindowActive(m_window.get()));
         list()->setFocus();
@@ -116,7 +97,12 @@ private Q_SLOTS:
             : list()->mapToGlobal(list()->imgN(1).geometry().center().toPoint());
         QCOMPARE(shown->pos().y(), at.y());
         QVERIFY(shown->pos().x() <= at.x() && shown->geometry().right() >= at.x());
-        QCOMPARE(activeActionsWalkingDown(shown), commands);
+        QStringList reached;
+        while (shown->activeAction() && !reached.contains(shown->activeAction()->objectName())) {
+            reached << shown->activeAction()->objectName();
+            QTest::keyClick(shown, Qt::Key_Down);
+        }
+        QCOMPARE(reached, commands);
         QTest::keyClick(shown, Qt::Key_Escape);
         QVERIFY(!shown->isVisible());
     }
@@ -141,11 +127,9 @@ private Q_SLOTS:
         QVERIFY(comboHadFocus);
     }
 
-    void windowAndActionsButtonAreNamed()
+    // A screen reader finds the Actions button by its caption and presses it.
+    void actionsButtonIsNamedAndPressable()
     {
-        QAccessibleInterface* window = QAccessible::queryAccessibleInterface(m_window.get());
-        QCOMPARE(window->role(), QAccessible::Window);
-        QCOMPARE(window->text(QAccessible::Name), u"Brimvault"_s);
         QAccessibleInterface* button = QAccessible::queryAccessibleInterface(m_window->imgActions());
         QCOMPARE(button->role(), QAccessible::Button);
         QCOMPARE(button->text(QAccessible::Name), u"Actions"_s);
@@ -155,5 +139,10 @@ private Q_SLOTS:
 };
 
 BV_REGISTER_TEST(TestKeyboardOnly);
+
+int main(int argc, char** argv)
+{
+    return RunRegisteredTests(argc, argv);
+}
 
 #include "tst_keyboardonly.moc"
