@@ -7,6 +7,7 @@
 #include "media/frmReclama.h"
 
 #include <QApplication>
+#include <QColor>
 #include <QDeadlineTimer>
 #include <QDir>
 #include <QElapsedTimer>
@@ -93,17 +94,11 @@ int main(int argc, char* argv[])
     PrepareWebEngine();
     QApplication app(argc, argv);
 
-    SwfBuilder builder(8, 550, 400, 24.0);
-    builder.setBackgroundColor(0x20, 0x40, 0x60);
-    builder.showFrame();
     const QString movie = QDir(root.path()).filePath(QStringLiteral("movie.swf"));
     const QString page = QDir(root.path()).filePath(QStringLiteral("page.html"));
-    QFile movieFile(movie);
     QFile pageFile(page);
-    if (!movieFile.open(QIODevice::WriteOnly) || !pageFile.open(QIODevice::WriteOnly))
+    if (!WriteFlashMovie(movie, QColor(0x20, 0x40, 0x60)) || !pageFile.open(QIODevice::WriteOnly))
         return 1;
-    movieFile.write(builder.bytes());
-    movieFile.close();
     pageFile.write("<!DOCTYPE html><html><body><p id=\"ready\">ready</p></body></html>");
     pageFile.close();
 

@@ -14,8 +14,8 @@ static PromptAnswer Fit(PromptAnswer wanted, PromptButtons buttons)
     return wanted == PromptAnswer::Ok ? PromptAnswer::Yes : wanted;
 }
 
-PromptRecorder::PromptRecorder(PromptAnswer answer)
-    : answer(answer)
+PromptRecorder::PromptRecorder(PromptAnswer given)
+    : answer(given)
 {
     SetPromptHandler([this](const PromptRequest& request) {
         prompts.append(request);

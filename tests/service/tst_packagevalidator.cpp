@@ -65,11 +65,13 @@ private Q_SLOTS:
         QTest::newRow("symbolic link") << QList {exe, Entry(u"Game/link"_s, Kind::SymbolicLink)} << u"symbolic link"_s;
         QTest::newRow("hard link") << QList {exe, Entry(u"Game/link"_s, Kind::HardLink)} << u"hard link"_s;
         QTest::newRow("special") << QList {exe, Entry(u"Game/fifo"_s, Kind::Special)} << u"special file"_s;
-        QTest::newRow("unreadable name") << QList {EntryHeader {.path = u"Game/Game.exe"_s, .pathReadable = false}}
+        QTest::newRow("unreadable name") << QList {EntryHeader {
+            .path = u"Game/Game.exe"_s, .pathReadable = false, .modified = {}}}
                                          << u"cannot be read"_s;
-        QTest::newRow("encrypted") << QList {exe, EntryHeader {.path = u"Game/d"_s, .encrypted = true}}
+        QTest::newRow("encrypted") << QList {exe, EntryHeader {.path = u"Game/d"_s, .encrypted = true, .modified = {}}}
                                    << u"encrypted"_s;
-        QTest::newRow("unknown size") << QList {exe, EntryHeader {.path = u"Game/d"_s, .sizeKnown = false}}
+        QTest::newRow("unknown size") << QList {exe,
+            EntryHeader {.path = u"Game/d"_s, .sizeKnown = false, .modified = {}}}
                                       << u"valid size"_s;
         QTest::newRow("negative size") << QList {exe, Entry(u"Game/d"_s, Kind::File, -5)} << u"valid size"_s;
         QTest::newRow("same file in other case") << QList {exe, Entry(u"Game/GAME.EXE"_s)} << u"twice"_s;

@@ -48,6 +48,27 @@ bool samePicture(const QPixmap& a, const QPixmap& b)
         && a.toImage().convertToFormat(QImage::Format_ARGB32) == b.toImage().convertToFormat(QImage::Format_ARGB32);
 }
 
+// Counts the list's paints that show more than one game before the fill has ended.
+class PaintsWhileFilling : public QObject {
+public:
+    explicit PaintsWhileFilling(frmMain* window)
+        : m_list(window->ListView1())
+    {
+        m_list->installEventFilter(this);
+        connect(window, &frmMain::listRebuilt, this, [this] { m_filled = true; });
+    }
+    bool eventFilter(QObject*, QEvent* event) override
+    {
+        count += !m_filled && event->type() == QEvent::Paint && m_list->loadedCount() > 1;
+        return false;
+    }
+    int count = 0;
+
+private:
+    SimpleListView* m_list;
+    bool m_filled = false;
+};
+
 } // namespace
 
 class TestFrmMain : public QObject {
@@ -96,6 +117,8 @@ private Q_SLOTS:
         m_env = std::make_unique<TestEnvironment>();
         m_program = std::make_unique<ProgramFolderFixture>(true);
         QVERIFY(RegisterQuillet());
+        // Again here: the built-in language takes its help page from this test's program folder.
+        modLocalizer::UseBuiltInLanguage();
         m_prompts = std::make_unique<PromptRecorder>(PromptAnswer::No);
     }
     void cleanup()
@@ -250,6 +273,18 @@ private Q_SLOTS:
         QCOMPARE(rebuilt.count(), 0);
         // A Windows game is only taken off the list; its file stays.
         QVERIFY(QFileInfo::exists(solitaire));
+    }
+
+    // The user sees the list grow: it is painted while discovery still adds games.
+    void listPaintedWhileItFills()
+    {
+        BuildSampleLibrary(*m_env);
+        frmMain window;
+        PaintsWhileFilling paints(&window);
+        QSignalSpy rebuilt(&window, &frmMain::listRebuilt);
+        window.show();
+        QVERIFY(rebuilt.wait(20000));
+        QVERIFY(paints.count > 0);
     }
 
     // Closed while its own loading lets events run: the window goes, once.
