@@ -42,7 +42,12 @@ void AddedGamesSnapshot::read()
 
 QString AddedGamesSnapshot::userName(const QString& path) const
 {
-    const QString key = m_keyByPath.value(normalised(path));
+    return userNameOfKnownPath(normalised(path));
+}
+
+QString AddedGamesSnapshot::userNameOfKnownPath(const QString& knownPath) const
+{
+    const QString key = m_keyByPath.value(knownPath);
     if (key.isEmpty())
         return QString();
     const QString number = key.mid(CatalogueKeys::FileKeyPrefix.size());

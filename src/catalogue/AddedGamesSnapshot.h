@@ -20,6 +20,8 @@ public:
     // The user's own name for the game: the "FileName" + n of the first entry whose path matches,
     // ignoring letter case and surrounding blanks; empty when there is none.
     QString userName(const QString& path) const;
+    // The same for a path already trimmed and lower-cased, as the list keeps its known paths.
+    QString userNameOfKnownPath(const QString& knownPath) const;
 
     // The highest entry number given out: "Count", or a higher number still in use.
     int highestNumber() const;

@@ -14,7 +14,9 @@
 #include <QFile>
 
 #include <dirent.h>
+#include <fcntl.h>
 #include <sys/stat.h>
+#include <unistd.h>
 #endif
 
 namespace Brimvault::FolderWalk {
@@ -42,6 +44,11 @@ constexpr int MaximumDepth = 256;
 
 struct WalkState {
     QList<WalkedFolder> result;
+    QList<bool> settled; // the folder's place and files are final
+    qsizetype handed = 0;
+    const FolderSink* found = nullptr;
+    std::optional<QString> handedRoot; // the root as the caller wrote it, when it is handed on too
+    bool stopped = false;
     QSet<QPair<quint64, quint64>> visited;
 };
 
@@ -62,25 +69,54 @@ bool isStopFolder(const QString& folder, const Listing& listing)
     return !mark.isEmpty() && InfoFiles::IsStopMark(folder + mark);
 }
 
+// Hands on the folders whose places and files are final, in walk order, and lets go of their listings.
+void handSettled(WalkState& state)
+{
+    while (!state.stopped && state.handed < state.result.size() && state.settled.at(state.handed)) {
+        WalkedFolder& folder = state.result[state.handed++];
+        state.stopped = !(*state.found)(folder);
+        folder.files.reset();
+    }
+}
+
+void settle(qsizetype ownIndex, WalkState& state)
+{
+    if (ownIndex < 0)
+        return;
+    state.settled[ownIndex] = true;
+    handSettled(state);
+}
+
 // ownIndex is the folder's place in the result, -1 for the root, which the caller keeps itself.
 void collect(const QString& folder, qsizetype ownIndex, int depth, WalkState& state)
 {
-    if (depth > MaximumDepth)
+    if (state.stopped)
         return;
+    // A folder too deep, or reached twice, keeps its place without a listing; it is listed when read.
+    if (depth > MaximumDepth)
+        return settle(ownIndex, state);
     Listing listing = ListFolder(folder);
     if (!firstVisit(listing, state))
-        return;
+        return settle(ownIndex, state);
     const bool stop = isStopFolder(folder, listing);
-    if (ownIndex >= 0)
-        state.result[ownIndex].files = std::move(listing.files);
-    if (stop)
-        return;
+    if (ownIndex < 0 && state.handedRoot) {
+        state.stopped = !(*state.found)({*state.handedRoot, listing.files});
+        if (state.stopped)
+            return;
+    }
     const QChar separator = separatorOf(folder);
     const qsizetype first = state.result.size();
-    for (const QString& name : std::as_const(listing.folders))
-        state.result.append({folder + name + separator, std::nullopt});
+    if (!stop) {
+        for (const QString& name : std::as_const(listing.folders)) {
+            state.result.append({folder + name + separator, std::nullopt});
+            state.settled.append(false);
+        }
+    }
     const qsizetype end = state.result.size();
-    for (qsizetype i = first; i < end; ++i) {
+    if (ownIndex >= 0)
+        state.result[ownIndex].files = std::move(listing.files);
+    settle(ownIndex, state);
+    for (qsizetype i = first; i < end && !state.stopped; ++i) {
         const QString child = state.result.at(i).path;
         collect(child, i, depth + 1, state);
     }
@@ -102,42 +138,92 @@ Listing ListFolder(const QString& folder)
     }
 #else
     const QByteArray base = QFile::encodeName(withSeparator(FileSystemPath(folder)));
-    DIR* dir = ::opendir(base.constData());
-    if (!dir)
-        return listing;
-    while (const dirent* entry = ::readdir(dir)) {
+    const auto take = [&](const char* name, unsigned char type) {
         // Dot entries are the hidden ones here, "." and ".." among them.
-        if (entry->d_name[0] == '.')
-            continue;
-        bool isDir = entry->d_type == DT_DIR;
-        bool isFile = entry->d_type == DT_REG;
-        if (entry->d_type == DT_UNKNOWN || entry->d_type == DT_LNK) {
+        if (name[0] == '.')
+            return;
+        bool isDir = type == DT_DIR;
+        bool isFile = type == DT_REG;
+        if (type == DT_UNKNOWN || type == DT_LNK) {
             struct stat status { };
-            if (::stat(QByteArray(base + entry->d_name).constData(), &status) == 0) {
+            if (::stat(QByteArray(base + name).constData(), &status) == 0) {
                 isDir = S_ISDIR(status.st_mode);
                 isFile = S_ISREG(status.st_mode);
             }
         }
         if (isDir)
-            listing.folders.append(QFile::decodeName(entry->d_name));
+            listing.folders.append(QFile::decodeName(name));
         else if (isFile)
-            listing.files.append(QFile::decodeName(entry->d_name));
+            listing.files.append(QFile::decodeName(name));
+    };
+#ifdef Q_OS_LINUX
+    // The entries are read straight into a buffer of our own: a walk lists every folder of a large library,
+    // and a directory stream would cost a further system call and a large allocation for each.
+    const int descriptor = ::open(base.constData(), O_RDONLY | O_DIRECTORY | O_CLOEXEC);
+    if (descriptor < 0)
+        return listing;
+    struct stat status { };
+    if (::fstat(descriptor, &status) == 0)
+        listing.identity = qMakePair(quint64(status.st_dev), quint64(status.st_ino));
+    alignas(dirent64) char buffer[32 * 1024];
+    ssize_t got = 0;
+    while ((got = ::getdents64(descriptor, buffer, sizeof buffer)) > 0) {
+        for (ssize_t at = 0; at < got;) {
+            const auto* entry = reinterpret_cast<const dirent64*>(buffer + at);
+            take(entry->d_name, entry->d_type);
+            at += entry->d_reclen;
+        }
     }
+    ::close(descriptor);
+#else
+    DIR* dir = ::opendir(base.constData());
+    if (!dir)
+        return listing;
+    while (const dirent* entry = ::readdir(dir))
+        take(entry->d_name, entry->d_type);
     struct stat status { };
     if (::fstat(::dirfd(dir), &status) == 0)
         listing.identity = qMakePair(quint64(status.st_dev), quint64(status.st_ino));
     ::closedir(dir);
 #endif
+#endif
     return listing;
+}
+
+namespace {
+
+bool walk(const QString& folder, const FolderSink& found, bool handRoot)
+{
+    if (folder.isEmpty())
+        return true;
+    WalkState state;
+    state.found = &found;
+    if (handRoot)
+        state.handedRoot = folder;
+    collect(withSeparator(folder), -1, 0, state);
+    return !state.stopped;
+}
+
+} // namespace
+
+bool WalkSubfolders(const QString& folder, const FolderSink& found)
+{
+    return walk(folder, found, false);
+}
+
+bool WalkFolderTree(const QString& folder, const FolderSink& found)
+{
+    return walk(folder, found, true);
 }
 
 QList<WalkedFolder> CollectSubfolders(const QString& folder)
 {
-    if (folder.isEmpty())
-        return {};
-    WalkState state;
-    collect(withSeparator(folder), -1, 0, state);
-    return state.result;
+    QList<WalkedFolder> folders;
+    WalkSubfolders(folder, [&folders](const WalkedFolder& found) {
+        folders.append(found);
+        return true;
+    });
+    return folders;
 }
 
 QStringList FilesOf(const WalkedFolder& folder)

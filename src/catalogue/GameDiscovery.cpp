@@ -26,46 +26,62 @@ GameDiscovery::GameDiscovery(ListBuilder& builder, CatalogueLocations locations)
     , m_locations(std::move(locations))
 { }
 
-QStringList GameDiscovery::InstalledGameFiles(const std::function<bool()>& stopRequested) const
+bool GameDiscovery::ForEachInstalledGameFile(const FileSink& found, const DiscoveryHooks& hooks) const
 {
-    QList<FolderWalk::WalkedFolder> folders;
-    for (const QString& root : {m_locations.gamesFolder, m_locations.programFolder}) {
-        if (root.isEmpty())
-            continue;
-        if (stopped(stopRequested))
-            return {};
-        folders.append({root, std::nullopt});
-        folders.append(FolderWalk::CollectSubfolders(root));
-    }
-
-    const QString gamesFolder = m_locations.gamesFolder;
+    // Folders are compared with these ignoring case: folded once here and once per folder, which costs far
+    // less than a case-insensitive comparison on every folder of a large library.
+    const QString gamesFolder = m_locations.gamesFolder.toCaseFolded();
     const QString advertisingFolder
-        = gamesFolder.isEmpty() ? QString() : gamesFolder + QStringLiteral("Reclama") + gamesFolder.back();
-    QStringList files;
-    for (const FolderWalk::WalkedFolder& folder : std::as_const(folders)) {
+        = gamesFolder.isEmpty() ? QString() : gamesFolder + QStringLiteral("reclama") + gamesFolder.back();
+    const auto handFiles = [&](const FolderWalk::WalkedFolder& folder) {
+        if (hooks.letEventsRun)
+            hooks.letEventsRun();
+        if (stopped(hooks.stopRequested))
+            return false;
         const QStringList names = FolderWalk::FilesOf(folder);
         // The list builder looks for the games' info files and icons in this same listing.
         m_builder.sideFiles().remember(folder.path, names);
         for (const QString& name : names) {
             if (!GameFileRules::IsDiscoverableExecutable(name))
                 continue;
-            if (stopped(stopRequested))
-                return {};
-            files.append(folder.path + name);
+            if (stopped(hooks.stopRequested) || !found(folder.path + name))
+                return false;
         }
-        const bool inGamesFolder = !gamesFolder.isEmpty() && folder.path.startsWith(gamesFolder, Qt::CaseInsensitive)
-            && !folder.path.startsWith(advertisingFolder, Qt::CaseInsensitive);
+        const QString foldedPath = folder.path.toCaseFolded();
+        const bool inGamesFolder
+            = !gamesFolder.isEmpty() && foldedPath.startsWith(gamesFolder) && !foldedPath.startsWith(advertisingFolder);
         if (!inGamesFolder)
-            continue;
+            return true;
         for (const QString& name : names) {
             if (!GameFileRules::HasExtension(name, QLatin1String("swf")))
                 continue;
-            if (stopped(stopRequested))
-                return {};
-            files.append(folder.path + name);
+            if (stopped(hooks.stopRequested) || !found(folder.path + name))
+                return false;
         }
+        return true;
+    };
+    // Each root, then every folder below it in walk order; a folder's games go on as soon as it is listed.
+    for (const QString& root : {m_locations.gamesFolder, m_locations.programFolder}) {
+        if (root.isEmpty())
+            continue;
+        if (stopped(hooks.stopRequested) || !FolderWalk::WalkFolderTree(root, handFiles))
+            return false;
     }
-    return files;
+    return true;
+}
+
+QStringList GameDiscovery::InstalledGameFiles(const std::function<bool()>& stopRequested) const
+{
+    QStringList files;
+    DiscoveryHooks hooks;
+    hooks.stopRequested = stopRequested;
+    const bool walked = ForEachInstalledGameFile(
+        [&files](const QString& file) {
+            files.append(file);
+            return true;
+        },
+        hooks);
+    return walked ? files : QStringList();
 }
 
 QStringList GameDiscovery::WindowsGameFiles() const
@@ -84,6 +100,8 @@ DiscoveryResult GameDiscovery::Run(const DiscoveryHooks& hooks)
     const auto handOn = [&](const GameEntry& entry) {
         if (hooks.addItem)
             hooks.addItem(entry);
+        if (hooks.letEventsRun)
+            hooks.letEventsRun();
         ++result.items;
         if (entry.source == IconSource::Queued)
             ++result.queuedIcons;
@@ -91,24 +109,33 @@ DiscoveryResult GameDiscovery::Run(const DiscoveryHooks& hooks)
         return !result.stopped;
     };
 
-    const QStringList installed = InstalledGameFiles(hooks.stopRequested);
-    if (stopped(hooks.stopRequested)) {
+    // The list is emptied, and the online games entry shown, when the first installed game is found (or
+    // after the walk when there is none): the user sees the first games while the walk goes on.
+    bool listStarted = false;
+    const auto startList = [&] {
+        if (listStarted)
+            return true;
+        listStarted = true;
+        if (hooks.clearList)
+            hooks.clearList();
+        const GameEntry online = m_builder.OnlineGamesEntry();
+        listedPaths.append(online.path.toUpper());
+        return handOn(online);
+    };
+    const bool walked = ForEachInstalledGameFile(
+        [&](const QString& path) {
+            if (!startList())
+                return false;
+            listedPaths.append(path.toUpper());
+            return handOn(m_builder.AddGameToList(path));
+        },
+        hooks);
+    if (!walked || stopped(hooks.stopRequested)) {
         result.stopped = true;
         return result;
     }
-    if (hooks.clearList)
-        hooks.clearList();
-
-    const GameEntry online = m_builder.OnlineGamesEntry();
-    listedPaths.append(online.path.toUpper());
-    if (!handOn(online))
+    if (!startList())
         return result;
-
-    for (const QString& path : installed) {
-        listedPaths.append(path.toUpper());
-        if (!handOn(m_builder.AddGameToList(path)))
-            return result;
-    }
 
     for (const QString& path : WindowsGameFiles()) {
         listedPaths.append(path.toUpper());

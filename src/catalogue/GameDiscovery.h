@@ -12,11 +12,12 @@ struct GameEntry;
 class ListBuilder;
 
 // What the window lends discovery: its closing flag, its list, and the chance to let pending events run
-// after each item (the core never processes events itself).
+// after each item and each folder listed (the core never processes events itself).
 struct DiscoveryHooks {
     std::function<bool()> stopRequested;
     std::function<void()> clearList;
     std::function<void(const GameEntry&)> addItem;
+    std::function<void()> letEventsRun;
 };
 
 struct DiscoveryResult {
@@ -33,8 +34,14 @@ public:
 
     DiscoveryResult Run(const DiscoveryHooks& hooks);
 
+    // Takes one found file; false stops discovery.
+    using FileSink = std::function<bool(const QString&)>;
+
     // The executables (and, inside the games folder, Flash movies) of the games folder and the program
-    // folder, each with every folder below it. Empty when stopped.
+    // folder, each with every folder below it, in walk order, each handed to `found` as soon as its folder
+    // is listed. False when stopped.
+    bool ForEachInstalledGameFile(const FileSink& found, const DiscoveryHooks& hooks) const;
+    // The same files at once. Empty when stopped.
     QStringList InstalledGameFiles(const std::function<bool()>& stopRequested) const;
     // The classic games of the Windows folder, the Microsoft Games (or Gaming Zone) folder, Pinball.
     QStringList WindowsGameFiles() const;

@@ -1,5 +1,6 @@
 #pragma once
 
+#include <QByteArray>
 #include <QImage>
 #include <QString>
 
@@ -24,6 +25,7 @@ struct GameEntry {
     IconSource source = IconSource::Queued;
     QString iconFile; // the .ico that gave the picture, for File and Cache
     QImage picture; // that picture, unless the builder was told not to keep pictures
+    QByteArray pictureImage; // or the icon image to decode it from when the list first shows it
 };
 
 } // namespace Brimvault

@@ -54,7 +54,8 @@ QString BuiltInName(const QString& fileTitle)
 {
     const QString title = fileTitle.toUpper();
     // Membership is a substring test, so a title such as "zm" is a member that matches no row.
-    if (kZoneMembership.toString().toUpper().contains(title))
+    static const QString membership = kZoneMembership.toString().toUpper();
+    if (membership.contains(title))
         return zoneName(fileTitle);
     static const QString makerList = u',' + MakerGameList().toUpper() + u',';
     if (makerList.contains(u',' + title + u','))

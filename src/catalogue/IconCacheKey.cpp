@@ -15,6 +15,9 @@ int SystemCodePage()
 
 int EightBitCode(QChar character, int codePage)
 {
+    // Every code page keeps ASCII where it is; only the rest needs its table.
+    if (character.unicode() < 0x80)
+        return character.unicode();
     const int code = modLocalizer::EncodeCharacter(character, codePage);
     // A character outside the code page is written as "?", as an 8-bit conversion does.
     return code < 0 ? int(u'?') : code;
@@ -34,7 +37,8 @@ QString IconCacheKey(const QString& path)
         if (odd > limit || even > limit)
             return QString();
     }
-    return GetFileName(path.toUpper(), false) + QString::number(odd) + QString::number(even);
+    // Upper-casing never makes a separator or a dot, so the title may be cut out first: a path is longer.
+    return GetFileName(path, false).toUpper() + QString::number(odd) + QString::number(even);
 }
 
 QString IconCacheFile(const QString& iconsFolder, const QString& path)

@@ -11,8 +11,6 @@
 #include "store/InfoFiles.h"
 #include "support/PathFunctions.h"
 
-#include <QFileInfo>
-
 namespace Brimvault {
 
 namespace {
@@ -22,17 +20,28 @@ QString knownPathOf(const QString& path)
     return path.trimmed().toLower();
 }
 
-// The picture of an icon file, null when the file is missing, unreadable or holds no usable image.
-QImage pictureOf(const QString& iconFile)
+// The picture of an icon file, when the file is there and holds a usable image; where it can be decoded
+// later, the image instead, so that a long list decodes only what it shows.
+struct IconPicture {
+    bool usable = false;
+    QImage picture;
+    QByteArray image;
+};
+
+IconPicture pictureOf(const QString& iconFile)
 {
-    // Only a regular file is read: a named pipe in the icon's place would block the window for good.
-    if (iconFile.isEmpty() || !QFileInfo(FileSystemPath(iconFile)).isFile())
+    // LoadIcon reads only a regular file: a named pipe in the icon's place cannot block the window.
+    if (iconFile.isEmpty())
         return {};
     try {
         cFileIcon icon;
         if (!icon.LoadIcon(FileSystemPath(iconFile)))
             return {};
-        return icon.ScreenIconPicture();
+        QByteArray image = icon.ScreenImageToDecodeLater();
+        if (!image.isEmpty())
+            return {true, {}, std::move(image)};
+        QImage picture = icon.ScreenIconPicture();
+        return {!picture.isNull(), std::move(picture), {}};
     } catch (const NumberedError&) {
         return {};
     }
@@ -74,7 +83,12 @@ GameEntry ListBuilder::OnlineGamesEntry() const
 
 QString ListBuilder::RawDisplayName(const QString& path) const
 {
-    QString name = m_addedGames.userName(path);
+    return rawDisplayName(path, knownPathOf(path));
+}
+
+QString ListBuilder::rawDisplayName(const QString& path, const QString& knownPath) const
+{
+    QString name = m_addedGames.userNameOfKnownPath(knownPath);
     if (name.isEmpty()) {
         const QString found = findSideFile(InfoFiles::GameInfoFileName(path));
         if (!found.isEmpty())
@@ -96,12 +110,14 @@ void ListBuilder::chooseIcon(GameEntry& entry) const
     const QString ownIcon = findSideFile(GetFileFolder(entry.path, true) + QStringLiteral(".ico"));
     const bool hasOwnIcon = !ownIcon.isEmpty();
     const QString candidate = hasOwnIcon ? ownIcon : IconCacheFile(m_iconsFolder, entry.path);
-    QImage picture = pictureOf(candidate);
-    if (!picture.isNull()) {
+    IconPicture found = pictureOf(candidate);
+    if (found.usable) {
         entry.source = hasOwnIcon ? IconSource::File : IconSource::Cache;
         entry.iconFile = candidate;
-        if (m_keepPictures)
-            entry.picture = std::move(picture);
+        if (m_keepPictures) {
+            entry.picture = std::move(found.picture);
+            entry.pictureImage = std::move(found.image);
+        }
     } else if (GetFileExtention(entry.path, false, false).toLower() == QLatin1String("swf")) {
         entry.source = IconSource::Flash;
     } else {
@@ -113,9 +129,10 @@ GameEntry ListBuilder::AddGameToList(const QString& path)
 {
     GameEntry entry;
     entry.path = path;
-    entry.caption = GameNames::TidyName(RawDisplayName(path));
+    QString knownPath = knownPathOf(path);
+    entry.caption = GameNames::TidyName(rawDisplayName(path, knownPath));
     chooseIcon(entry);
-    m_knownPaths.insert(knownPathOf(path));
+    m_knownPaths.insert(std::move(knownPath));
     return entry;
 }
 

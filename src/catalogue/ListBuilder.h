@@ -39,6 +39,7 @@ public:
     const QString& iconsFolder() const { return m_iconsFolder; }
 
 private:
+    QString rawDisplayName(const QString& path, const QString& knownPath) const;
     void chooseIcon(GameEntry& entry) const;
     // The file as spelled on disk, found in its folder without regard to case; empty when missing.
     QString findSideFile(const QString& file) const;

@@ -40,7 +40,8 @@ QString SideFiles::matchName(const QStringList& files, const QString& name)
 {
     QString match;
     for (const QString& file : files) {
-        if (file.compare(name, Qt::CaseInsensitive) != 0)
+        // Letter case never changes a name's length; the length test spares most comparisons.
+        if (file.size() != name.size() || file.compare(name, Qt::CaseInsensitive) != 0)
             continue;
         if (file == name)
             return file;

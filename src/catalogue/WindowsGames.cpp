@@ -93,15 +93,14 @@ QStringList Files(const CatalogueLocations& locations)
 
     const QString gamesFolder = microsoftGamesFolder(locations);
     if (isFolder(gamesFolder)) {
-        QList<FolderWalk::WalkedFolder> folders {{gamesFolder + NativeSeparator(), std::nullopt}};
-        folders.append(FolderWalk::CollectSubfolders(gamesFolder + NativeSeparator()));
-        for (const FolderWalk::WalkedFolder& folder : std::as_const(folders)) {
+        FolderWalk::WalkFolderTree(gamesFolder + NativeSeparator(), [&files](const FolderWalk::WalkedFolder& folder) {
             for (const QString& name : FolderWalk::FilesOf(folder)) {
                 if (GameFileRules::HasExtension(name, QLatin1String("exe"))
                     && name.toUpper() != QLatin1String("ZCLIENTM.EXE"))
                     files.append(folder.path + name);
             }
-        }
+            return true;
+        });
     }
 
     const QString pinballGame = pinball();

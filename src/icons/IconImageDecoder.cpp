@@ -170,61 +170,80 @@ void decodeRow(const BitmapLayout& layout, const std::array<QRgb, 256>& palette,
     }
 }
 
+bool maskBit(const uchar* maskRow, int x)
+{
+    return (maskRow[x / 8] >> (7 - x % 8)) & 1;
+}
+
+// Where the mask is set the screen shows through (inverting it is not something a picture can hold);
+// elsewhere the pixel is opaque. Kept apart from the rest so that the loops stay plain.
+void applyMask(QRgb* pixels, const uchar* maskRow, int width)
+{
+    if (!maskRow) {
+        for (int x = 0; x < width; ++x)
+            pixels[x] |= Opaque;
+        return;
+    }
+    for (int x = 0; x < width; ++x)
+        pixels[x] = maskBit(maskRow, x) ? qRgba(0, 0, 0, 0) : (pixels[x] | Opaque);
+}
+
+bool anyAlphaIn(const QRgb* pixels, int width)
+{
+    QRgb seen = 0;
+    for (int x = 0; x < width; ++x)
+        seen |= pixels[x];
+    return qAlpha(seen) != 0;
+}
+
 Bitmaps decodeBitmap(const QByteArray& image, Wanted wanted)
 {
     const ByteReader reader {QByteArrayView(image)};
     const auto layout = layoutOf(reader);
     if (!layout)
         return {};
-    const bool hasMask = !layout->maskBlock.isEmpty();
     const bool all = wanted == Wanted::All;
+    const int width = layout->width;
     Bitmaps out;
-    out.composed = QImage(layout->width, layout->height, QImage::Format_ARGB32);
+    out.composed = QImage(width, layout->height, QImage::Format_ARGB32);
     if (all) {
-        out.colour = QImage(layout->width, layout->height, QImage::Format_RGB32);
-        out.mask = QImage(layout->width, layout->height, QImage::Format_RGB32);
+        out.colour = QImage(width, layout->height, QImage::Format_RGB32);
+        out.mask = QImage(width, layout->height, QImage::Format_RGB32);
     }
     if (out.composed.isNull() || (all && (out.colour.isNull() || out.mask.isNull())))
         return {};
     const std::array<QRgb, 256> palette = paletteOf(reader, *layout);
     const auto* colourBits = reinterpret_cast<const uchar*>(layout->colourBlock.data());
     const auto* maskBits = reinterpret_cast<const uchar*>(layout->maskBlock.data());
+    const auto maskRowOf = [&](int y) -> const uchar* {
+        const int stored = layout->bottomUp ? layout->height - 1 - y : y;
+        return layout->maskBlock.isEmpty() ? nullptr : maskBits + layout->maskRow * stored;
+    };
+    const auto composedRow = [&](int y) { return reinterpret_cast<QRgb*>(out.composed.scanLine(y)); };
     bool anyAlpha = false;
     for (int y = 0; y < layout->height; ++y) {
         const int stored = layout->bottomUp ? layout->height - 1 - y : y;
-        QRgb* composed = reinterpret_cast<QRgb*>(out.composed.scanLine(y));
+        QRgb* composed = composedRow(y);
         decodeRow(*layout, palette, colourBits + layout->colourRow * stored, composed);
-        if (layout->bitCount == 32 && !anyAlpha) {
-            for (int x = 0; x < layout->width && !anyAlpha; ++x)
-                anyAlpha = qAlpha(composed[x]) != 0;
-        }
-        const uchar* maskRow = hasMask ? maskBits + layout->maskRow * stored : nullptr;
-        QRgb* colour = all ? reinterpret_cast<QRgb*>(out.colour.scanLine(y)) : nullptr;
-        QRgb* mask = all ? reinterpret_cast<QRgb*>(out.mask.scanLine(y)) : nullptr;
-        for (int x = 0; x < layout->width; ++x) {
-            const QRgb pixel = composed[x] | Opaque;
-            const bool transparent = maskRow && ((maskRow[x / 8] >> (7 - x % 8)) & 1);
-            if (all) {
-                colour[x] = pixel;
-                mask[x] = transparent ? MaskShows : MaskCovers;
+        const uchar* maskRow = maskRowOf(y);
+        if (all) {
+            auto* colour = reinterpret_cast<QRgb*>(out.colour.scanLine(y));
+            auto* mask = reinterpret_cast<QRgb*>(out.mask.scanLine(y));
+            for (int x = 0; x < width; ++x) {
+                colour[x] = composed[x] | Opaque;
+                mask[x] = maskRow && maskBit(maskRow, x) ? MaskShows : MaskCovers;
             }
-            // Where the mask is set, the screen shows through; inverting it is not something a picture can hold.
-            // Alpha pixels keep their stored value until we know whether the image uses alpha at all.
-            if (layout->bitCount != 32)
-                composed[x] = transparent ? qRgba(0, 0, 0, 0) : pixel;
         }
+        // Alpha pixels keep their stored value until we know whether the image uses alpha at all.
+        if (layout->bitCount == 32)
+            anyAlpha = anyAlpha || anyAlphaIn(composed, width);
+        else
+            applyMask(composed, maskRow, width);
     }
     // A 32-bit image that carries alpha is drawn by its alpha, not its mask.
     if (layout->bitCount == 32 && !anyAlpha) {
-        for (int y = 0; y < layout->height; ++y) {
-            const int stored = layout->bottomUp ? layout->height - 1 - y : y;
-            const uchar* maskRow = hasMask ? maskBits + layout->maskRow * stored : nullptr;
-            QRgb* composed = reinterpret_cast<QRgb*>(out.composed.scanLine(y));
-            for (int x = 0; x < layout->width; ++x) {
-                const bool transparent = maskRow && ((maskRow[x / 8] >> (7 - x % 8)) & 1);
-                composed[x] = transparent ? qRgba(0, 0, 0, 0) : (composed[x] | Opaque);
-            }
-        }
+        for (int y = 0; y < layout->height; ++y)
+            applyMask(composedRow(y), maskRowOf(y), width);
     }
     return out;
 }
@@ -234,6 +253,11 @@ Bitmaps decodeBitmap(const QByteArray& image, Wanted wanted)
 bool IsPng(const QByteArray& image)
 {
     return image.startsWith(QByteArrayView(PngSignature, 8));
+}
+
+bool IsSoundBitmap(const QByteArray& image)
+{
+    return !IsPng(image) && layoutOf(ByteReader(QByteArrayView(image))).has_value();
 }
 
 Bitmaps Decode(const QByteArray& image)

@@ -23,6 +23,8 @@ Bitmaps Decode(const QByteArray& image);
 QImage DecodePicture(const QByteArray& image);
 
 bool IsPng(const QByteArray& image);
+// A bitmap image (not PNG) whose header and bits hold together: DecodePicture gives it a picture.
+bool IsSoundBitmap(const QByteArray& image);
 
 } // namespace IconImageDecoder
 

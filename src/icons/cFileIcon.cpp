@@ -3,6 +3,7 @@
 #include "icons/ByteReader.h"
 #include "icons/NumberedError.h"
 #include "icons/PeLayout.h"
+#include "support/ReadOnlyFile.h"
 
 #include <QFile>
 #include <QtEndian>
@@ -90,13 +91,13 @@ bool cFileIcon::LoadIcon(const QString& sFileName)
     reset(sFileName);
     m_lastLoadMessage.clear();
     // One read takes in the whole of a usual icon file; images beyond it are read on their own.
-    QFile file(sFileName);
-    const bool opened = file.open(QIODevice::ReadOnly | QIODevice::Unbuffered);
-    const qint64 fileSize = opened ? file.size() : 0;
+    // A folder or a named pipe in the icon's place is refused, not waited on.
+    ReadOnlyFile file(sFileName);
+    const qint64 fileSize = file.size();
     QByteArray bytes;
     const auto readUpTo = [&](qint64 end) {
-        if (opened && end > bytes.size())
-            bytes += file.read(qMax(end, qMin(fileSize, FirstReadSize)) - bytes.size());
+        if (end > bytes.size())
+            bytes += file.readAt(bytes.size(), qMax(end, qMin(fileSize, FirstReadSize)) - bytes.size());
     };
     // A file that cannot be opened reads as nothing: the zeroed header then fails the type test.
     readUpTo(IconHeaderSize);
@@ -137,8 +138,8 @@ bool cFileIcon::LoadIcon(const QString& sFileName)
         QByteArray image;
         if (fits && offset + size <= bytes.size())
             image = bytes.sliced(offset, size);
-        else if (fits && file.seek(offset))
-            image = file.read(size);
+        else if (fits)
+            image = file.readAt(offset, size);
         if (!fits || image.size() < size) {
             m_lastLoadMessage = QStringLiteral("Icon Images Array is Corrupt.");
             failed = true;

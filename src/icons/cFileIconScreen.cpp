@@ -2,6 +2,8 @@
 // real pixels, so a 64- or 256-pixel image is not blurred up from the 32-pixel one.
 #include "icons/cFileIcon.h"
 
+#include "icons/IconImageDecoder.h"
+
 #include <QImage>
 #include <QScreen>
 
@@ -42,6 +44,16 @@ int cFileIcon::sharpIconIndex(int wantedPixels, int wantedDepth) const
             best = i;
     }
     return best;
+}
+
+QByteArray cFileIcon::ScreenImageToDecodeLater()
+{
+    if (m_entries.isEmpty() || displayPixelRatio() > 1.0)
+        return {};
+    const int index = bestIconIndex(displayDepth());
+    if (index < 1 || index > m_images.size() || !IconImageDecoder::IsSoundBitmap(m_images.at(index - 1)))
+        return {};
+    return m_images.at(index - 1);
 }
 
 QImage cFileIcon::ScreenIconPicture()

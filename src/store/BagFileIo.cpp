@@ -1,5 +1,7 @@
 #include "store/BagFileIo.h"
 
+#include "support/ReadOnlyFile.h"
+
 #include <QDir>
 #include <QFile>
 #include <QFileInfo>
@@ -27,24 +29,21 @@ bool isFile(const QString& fileName)
 
 ReadResult readText(const QString& fileName)
 {
-    const QFileInfo info(fileSystemPath(fileName));
-    if (!info.exists())
+    ReadOnlyFile file(fileSystemPath(fileName));
+    if (file.state() == ReadOnlyFile::State::Missing)
         return {};
-    if (!info.isFile() || info.size() > MaximumFileSize)
-        return {ReadStatus::Unreadable, {}};
-    QFile file(info.filePath());
-    if (!file.open(QIODevice::ReadOnly))
+    if (!file.isOpen() || file.size() > MaximumFileSize)
         return {ReadStatus::Unreadable, {}};
     // Asking for the largest size at once would allocate it for every small file; read what is there instead,
-    // and keep reading in case the file grew since it was looked at.
-    QByteArray bytes = file.read(info.size() + 1);
-    while (bytes.size() > info.size() && bytes.size() <= MaximumFileSize && file.error() == QFileDevice::NoError) {
-        const QByteArray more = file.read(qMin<qint64>(MaximumFileSize + 1 - bytes.size(), 1 << 20));
+    // and keep reading in case the file grew since it was opened.
+    QByteArray bytes = file.readAt(0, file.size() + 1);
+    while (bytes.size() > file.size() && bytes.size() <= MaximumFileSize && !file.failed()) {
+        const QByteArray more = file.readAt(bytes.size(), qMin<qint64>(MaximumFileSize + 1 - bytes.size(), 1 << 20));
         if (more.isEmpty())
             break;
         bytes += more;
     }
-    if (file.error() != QFileDevice::NoError || bytes.size() > MaximumFileSize)
+    if (file.failed() || bytes.size() > MaximumFileSize)
         return {ReadStatus::Unreadable, {}};
     QStringDecoder decoder(QStringConverter::System, QStringConverter::Flag::Stateless);
     return {ReadStatus::Read, decoder.decode(bytes)};

@@ -20,6 +20,23 @@ QString recordValue(const clsFileBag& bag, const QString& part)
     return bag.GetValue(clsFileBag::MakeKey(part)).trimmed();
 }
 
+// The keys of a game's name records for one language; a list reads thousands of info files in one language,
+// so the keys are made once.
+struct NameKeys {
+    QString language;
+    QString localised;
+    QString plain;
+};
+
+const NameKeys& nameKeysFor(const QString& lngNik)
+{
+    static NameKeys keys {QString(), clsFileBag::MakeKey(CatalogueKeys::NameRecord + u'_'),
+        clsFileBag::MakeKey(CatalogueKeys::NameRecord)};
+    if (keys.language != lngNik)
+        keys = {lngNik, clsFileBag::MakeKey(CatalogueKeys::NameRecord + u'_' + lngNik), keys.plain};
+    return keys;
+}
+
 } // namespace
 
 QString GameInfoFileName(const QString& gamePath)
@@ -42,8 +59,9 @@ QString ReadGameName(const QString& infoFile, const QString& lngNik)
     // A missing info file, or a folder in its place, reads as an empty bag.
     clsFileBag bag;
     bag.OpenFile(infoFile);
-    const QString localised = recordValue(bag, CatalogueKeys::NameRecord + u'_' + lngNik);
-    return localised.isEmpty() ? recordValue(bag, CatalogueKeys::NameRecord) : localised;
+    const NameKeys& keys = nameKeysFor(lngNik);
+    const QString localised = bag.GetValue(keys.localised).trimmed();
+    return localised.isEmpty() ? bag.GetValue(keys.plain).trimmed() : localised;
 }
 
 QString DirInfoFileName(const QString& folder)

@@ -2,6 +2,7 @@
 #include "catalogue/IconCacheKey.h"
 #include "catalogue/ListBuilder.h"
 #include "i18n/modLocalizer.h"
+#include "icons/IconImageDecoder.h"
 #include "store/DataFolders.h"
 #include "store/SettingsStore.h"
 
@@ -84,8 +85,13 @@ private Q_SLOTS:
                     + "FileName8=Wrong\n");
             return ListOne(path).caption;
         };
+        // The window decodes a sound bitmap image when it first shows it.
+        const auto shownWidth = [](const GameEntry& entry) {
+            return entry.picture.isNull() ? IconImageDecoder::DecodePicture(entry.pictureImage).width()
+                                          : entry.picture.width();
+        };
         // Where the icon comes from, the file shown and its width; v: a valid icon file, c: a corrupt one.
-        const auto icon = [](const QString& fileName, char own, char cache) -> QString {
+        const auto icon = [shownWidth](const QString& fileName, char own, char cache) -> QString {
             TestEnvironment env;
             const QByteArray valid = ValidIconFile();
             if (valid.isEmpty())
@@ -101,11 +107,13 @@ private Q_SLOTS:
             const GameEntry entry = ListOne(path);
             // The command line asks for the decision without the picture.
             const GameEntry bare = ListOne(path, false);
-            return IconSourceName(entry.source) + u' ' + QString::number(entry.picture.width())
+            return IconSourceName(entry.source) + u' ' + QString::number(shownWidth(entry))
                 + (entry.iconFile == ownFile          ? u" own"_s
                         : entry.iconFile == cacheFile ? u" cache"_s
                                                       : entry.iconFile)
-                + (bare.source == entry.source && bare.picture.isNull() ? QString() : u" differs bare"_s);
+                + (bare.source == entry.source && bare.picture.isNull() && bare.pictureImage.isEmpty()
+                        ? QString()
+                        : u" differs bare"_s);
         };
         // Each takes the first source that has a name: user, info file, zone table, version text, file title.
         QTest::newRow("user name first") << caption(u"hrtzzm.exe"_s, {}, "My Hearts", "<>Name<Info Hearts")

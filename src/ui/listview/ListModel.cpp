@@ -48,7 +48,7 @@ void ListModel::copyContent(int from, int to)
 {
     const ListItem& source = at(from);
     ListItem& target = at(to);
-    target.face.setPicture(source.face.picture());
+    target.face.setPictureOf(source.face);
     target.caption = source.caption;
     target.captionHeight = source.captionHeight;
     target.tag = source.tag;

@@ -49,7 +49,12 @@ void SimpleListView::ArrangeConstituentControls() { }
 
 bool SimpleListView::Add(const QPixmap& Picture, const QString& Caption, const QString& Data)
 {
-    return addItem(&Picture, Caption, Data);
+    return addItem([&Picture](IconFace& face) { face.setPicture(Picture); }, Caption, Data);
+}
+
+bool SimpleListView::Add(IconFace::PictureSource Picture, const QString& Caption, const QString& Data)
+{
+    return addItem([&Picture](IconFace& face) { face.setPictureSource(std::move(Picture)); }, Caption, Data);
 }
 
 qint16 SimpleListView::AddEx(const QString& Caption, const QString& Data)
@@ -58,7 +63,8 @@ qint16 SimpleListView::AddEx(const QString& Caption, const QString& Data)
     return addItem(nullptr, Caption, Data) ? qint16(index) : qint16(-1);
 }
 
-bool SimpleListView::addItem(const QPixmap* picture, const QString& caption, const QString& dataString)
+bool SimpleListView::addItem(
+    const std::function<void(IconFace&)>& setPicture, const QString& caption, const QString& dataString)
 {
     const int index = m_state.itemCount;
     if (index >= ListGrid::MaxItems) {
@@ -75,8 +81,8 @@ bool SimpleListView::addItem(const QPixmap* picture, const QString& caption, con
         GridLayout::placeNext(item, m_state, usableWidth());
 
     item.face.setBackColor(m_backColor.rgb());
-    if (picture)
-        item.face.setPicture(*picture);
+    if (setPicture)
+        setPicture(item.face);
     else
         item.iconData = dataString;
     item.iconVisible = true;

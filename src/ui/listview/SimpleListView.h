@@ -36,6 +36,8 @@ public:
 
     void ArrangeConstituentControls();
     bool Add(const QPixmap& Picture, const QString& Caption, const QString& Data);
+    // The same, with a picture made only when the item is first painted or its picture is asked for.
+    bool Add(IconFace::PictureSource Picture, const QString& Caption, const QString& Data);
     // Both raise the overflow error (NumberedError 6) beyond 32767 items; AddEx returns the new item's index.
     qint16 AddEx(const QString& Caption, const QString& Data);
     // Removing the only item fails with the missing-element error and leaves the selection tag at "-1";
@@ -145,7 +147,8 @@ private:
     };
 
     // Items
-    bool addItem(const QPixmap* picture, const QString& caption, const QString& dataString);
+    // A picture, or a source of one, or neither (the item then waits for its icon).
+    bool addItem(const std::function<void(IconFace&)>& setPicture, const QString& caption, const QString& dataString);
     void clearItems();
     void setCaptionText(ListItem& item, const QString& text);
     QRectF shownIconRect(const ListItem& item) const;

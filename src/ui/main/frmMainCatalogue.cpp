@@ -8,6 +8,7 @@
 #include "catalogue/IconCacheBuilder.h"
 #include "catalogue/ListBuilder.h"
 #include "catalogue/ListOrder.h"
+#include "icons/IconImageDecoder.h"
 #include "icons/NumberedError.h"
 #include "store/PlayHistory.h"
 #include "support/PathFunctions.h"
@@ -19,12 +20,20 @@
 #include "ui/main/QuilletCalls.h"
 
 #include <QCoreApplication>
+#include <QElapsedTimer>
 #include <QMimeData>
 #include <QScopeGuard>
 #include <QTimer>
 #include <QUrl>
 
 namespace Brimvault {
+
+namespace {
+
+// How long the fill may go without letting pending events run: well under one frame.
+constexpr qint64 EventPeriodMilliseconds = 8;
+
+} // namespace
 
 void frmMain::RebuildList()
 {
@@ -59,7 +68,21 @@ void frmMain::RebuildList()
                 addEntry(entry);
             else
                 held.append(entry);
+        };
+        // Asking the system for events costs more than adding an item; a few milliseconds apart is as
+        // responsive as after every item, and leaves the fill its speed. The moment the games reach the
+        // bottom of the window it is painted, so that the user sees a full window at once.
+        QElapsedTimer sinceEvents;
+        sinceEvents.start();
+        bool screenShown = false;
+        hooks.letEventsRun = [this, &sinceEvents, &screenShown] {
+            const bool screenJustFilled
+                = !screenShown && m_listView->layoutState().lowestBottom >= m_listView->height();
+            if (!screenJustFilled && sinceEvents.elapsed() < EventPeriodMilliseconds)
+                return;
+            screenShown = screenShown || screenJustFilled;
             QCoreApplication::processEvents();
+            sinceEvents.restart();
         };
         const DiscoveryResult result = discovery.Run(hooks);
         if (result.stopped || m_closing)
@@ -92,6 +115,12 @@ void frmMain::addListItem(const GameEntry& entry)
     switch (entry.source) {
     case IconSource::File:
     case IconSource::Cache:
+        if (!entry.pictureImage.isEmpty()) {
+            m_listView->Add(
+                [image = entry.pictureImage] { return QPixmap::fromImage(IconImageDecoder::DecodePicture(image)); },
+                entry.caption, entry.path);
+            return;
+        }
         if (!entry.picture.isNull()) {
             m_listView->Add(QPixmap::fromImage(entry.picture), entry.caption, entry.path);
             return;

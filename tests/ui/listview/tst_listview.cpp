@@ -141,6 +141,29 @@ private Q_SLOTS:
         QCOMPARE(list->imgN(1).BackColor(), FrameFill);
     }
 
+    // A long list makes a picture only when its item is painted or asked for; removal moves the picture still
+    // to be made with its item.
+    void picturesMadeWhenFirstNeeded()
+    {
+        auto list = ShownList<SimpleListView>(400, 400, 0);
+        QList<QPixmap> pictures;
+        int made = 0;
+        for (int i = 0; i < 200; ++i) {
+            pictures << QPixmap(32, 32);
+            pictures.last().fill(QColor::fromHsv(i, 200, 200));
+            list->Add([&made, &pictures, i] { return ++made, pictures.at(i); }, SampleCaption(i), SamplePath(i));
+        }
+        list->Refresh();
+        list->grab();
+        QVERIFY(made > 0 && made < 50);
+        const int madeOnScreen = made;
+        QTest::mouseClick(list.get(), Qt::LeftButton, {}, iconAt(*list, 0));
+        QCOMPARE(list->RemoveCurrentItem().number, 0);
+        QCOMPARE(made, madeOnScreen);
+        QCOMPARE(list->imgN(150).Picture().cacheKey(), pictures.at(151).cacheKey());
+        QCOMPARE(made, madeOnScreen + 1);
+    }
+
     void enterAndLeftDoubleClickRaiseEnterKey()
     {
         auto list = ShownList<SimpleListView>(400, 400, 4);

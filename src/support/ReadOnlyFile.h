@@ -1,0 +1,42 @@
+#pragma once
+
+#include <QByteArray>
+#include <QString>
+
+#include <memory>
+
+namespace Brimvault {
+
+// A file opened for reading with as few system calls as a plain read takes: the list reads an info file and
+// an icon for every game, so each look-up saved is saved ten thousand times. Anything but a regular file (a
+// folder, a named pipe, a device) is refused without being waited on.
+class ReadOnlyFile {
+public:
+    enum class State {
+        Missing, // nothing of that name
+        NotReadable, // there, but not a regular file, or not ours to read
+        Open,
+    };
+
+    explicit ReadOnlyFile(const QString& path);
+    ~ReadOnlyFile();
+    ReadOnlyFile(const ReadOnlyFile&) = delete;
+    ReadOnlyFile& operator=(const ReadOnlyFile&) = delete;
+
+    State state() const { return m_state; }
+    bool isOpen() const { return m_state == State::Open; }
+    // The size when opened.
+    qint64 size() const { return m_size; }
+    // Up to `count` bytes from `offset`; fewer at the end of the file, none after an error.
+    QByteArray readAt(qint64 offset, qint64 count);
+    bool failed() const { return m_failed; }
+
+private:
+    struct Handle;
+    std::unique_ptr<Handle> m_handle;
+    State m_state = State::Missing;
+    qint64 m_size = 0;
+    bool m_failed = false;
+};
+
+} // namespace Brimvault
