@@ -16,6 +16,7 @@
 #include <QJsonDocument>
 #include <QJsonObject>
 #include <QProcess>
+#include <QtEndian>
 
 using namespace Brimvault;
 using namespace Qt::StringLiterals;
@@ -90,8 +91,15 @@ private Q_SLOTS:
             return entry.picture.isNull() ? IconImageDecoder::DecodePicture(entry.pictureImage).width()
                                           : entry.picture.width();
         };
-        // Where the icon comes from, the file shown and its width; v: a valid icon file, c: a corrupt one.
-        const auto icon = [shownWidth](const QString& fileName, char own, char cache) -> QString {
+        // Every image's header zeroed: the directory is sound, no image can be drawn.
+        const auto damagedImages = [](QByteArray icon) {
+            for (int i = 0; i < qFromLittleEndian<quint16>(icon.constData() + 4); ++i)
+                icon.replace(qFromLittleEndian<quint32>(icon.constData() + 18 + 16 * i), 4, QByteArray(4, '\0'));
+            return icon;
+        };
+        // Where the icon comes from, the file shown and its width; v: a valid icon file, c: a cut one,
+        // d: one with damaged images.
+        const auto icon = [shownWidth, damagedImages](const QString& fileName, char own, char cache) -> QString {
             TestEnvironment env;
             const QByteArray valid = ValidIconFile();
             if (valid.isEmpty())
@@ -100,10 +108,13 @@ private Q_SLOTS:
             const QString ownFile = path.left(path.lastIndexOf(u'.')) + u".ICO"_s;
             const QString cacheFile = cacheOf(path);
             WriteFile(path);
+            const auto bytes = [&](char kind) {
+                return kind == 'v' ? valid : kind == 'd' ? damagedImages(valid) : valid.left(40);
+            };
             if (own != '-')
-                WriteFile(ownFile, own == 'v' ? valid : valid.left(40));
+                WriteFile(ownFile, bytes(own));
             if (cache != '-')
-                WriteFile(cacheFile, cache == 'v' ? valid : valid.left(40));
+                WriteFile(cacheFile, bytes(cache));
             const GameEntry entry = ListOne(path);
             // The command line asks for the decision without the picture.
             const GameEntry bare = ListOne(path, false);
@@ -133,7 +144,7 @@ private Q_SLOTS:
         QTest::newRow("own icon wins over cache") << icon(u"a.exe"_s, 'v', 'v') << u"file 32 own"_s;
         QTest::newRow("corrupt own icon queues, cache or not") << icon(u"a.exe"_s, 'c', 'v') << u"queued 0"_s;
         QTest::newRow("cache") << icon(u"a.exe"_s, '-', 'v') << u"cache 32 cache"_s;
-        QTest::newRow("corrupt cache") << icon(u"a.exe"_s, '-', 'c') << u"queued 0"_s;
+        QTest::newRow("cache with damaged images") << icon(u"a.exe"_s, '-', 'd') << u"queued 0"_s;
         QTest::newRow("nothing") << icon(u"a.exe"_s, '-', '-') << u"queued 0"_s;
         QTest::newRow("flash with corrupt cache") << icon(u"movie.SWF"_s, '-', 'c') << u"flash 0"_s;
         QTest::newRow("flash with own icon") << icon(u"movie.swf"_s, 'v', '-') << u"file 32 own"_s;
