@@ -1,6 +1,5 @@
 #pragma once
 
-#include <QByteArray>
 #include <QImage>
 #include <QString>
 
@@ -25,7 +24,7 @@ struct GameEntry {
     IconSource source = IconSource::Queued;
     QString iconFile; // the .ico that gave the picture, for File and Cache
     QImage picture; // that picture, unless the builder was told not to keep pictures
-    QByteArray pictureImage; // or the icon image to decode it from when the list first shows it
+    bool pictureLater = false; // or, for a sound icon file, made from it when the list first shows it
 };
 
 } // namespace Brimvault

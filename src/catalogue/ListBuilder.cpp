@@ -20,15 +20,15 @@ QString knownPathOf(const QString& path)
     return path.trimmed().toLower();
 }
 
-// The picture of an icon file, when the file is there and holds a usable image; where it can be decoded
-// later, the image instead, so that a long list decodes only what it shows.
+// Whether an icon file is there and holds a usable picture, and that picture. Where the picture is sure to
+// come out of the file's best image, it is left to be decoded when shown: a long list shows few of them,
+// and keeps neither images nor pictures for the rest.
 struct IconPicture {
     bool usable = false;
     QImage picture;
-    QByteArray image;
 };
 
-IconPicture pictureOf(const QString& iconFile)
+IconPicture pictureOf(const QString& iconFile, bool decodeLater)
 {
     // LoadIcon reads only a regular file: a named pipe in the icon's place cannot block the window.
     if (iconFile.isEmpty())
@@ -37,11 +37,10 @@ IconPicture pictureOf(const QString& iconFile)
         cFileIcon icon;
         if (!icon.LoadIcon(FileSystemPath(iconFile)))
             return {};
-        QByteArray image = icon.ScreenImageToDecodeLater();
-        if (!image.isEmpty())
-            return {true, {}, std::move(image)};
+        if (decodeLater && icon.ScreenPictureIsSound())
+            return {true, {}};
         QImage picture = icon.ScreenIconPicture();
-        return {!picture.isNull(), std::move(picture), {}};
+        return {!picture.isNull(), std::move(picture)};
     } catch (const NumberedError&) {
         return {};
     }
@@ -70,6 +69,11 @@ QString ListBuilder::findSideFile(const QString& file) const
 {
     const qsizetype separator = qMax(file.lastIndexOf(u'/'), file.lastIndexOf(u'\\'));
     return m_sideFiles.find(file.left(separator + 1), file.mid(separator + 1));
+}
+
+QImage ListBuilder::ShownPicture(const QString& iconFile)
+{
+    return pictureOf(iconFile, false).picture;
 }
 
 GameEntry ListBuilder::OnlineGamesEntry() const
@@ -110,13 +114,13 @@ void ListBuilder::chooseIcon(GameEntry& entry) const
     const QString ownIcon = findSideFile(GetFileFolder(entry.path, true) + QStringLiteral(".ico"));
     const bool hasOwnIcon = !ownIcon.isEmpty();
     const QString candidate = hasOwnIcon ? ownIcon : IconCacheFile(m_iconsFolder, entry.path);
-    IconPicture found = pictureOf(candidate);
+    IconPicture found = pictureOf(candidate, true);
     if (found.usable) {
         entry.source = hasOwnIcon ? IconSource::File : IconSource::Cache;
         entry.iconFile = candidate;
         if (m_keepPictures) {
+            entry.pictureLater = found.picture.isNull();
             entry.picture = std::move(found.picture);
-            entry.pictureImage = std::move(found.image);
         }
     } else if (GetFileExtention(entry.path, false, false).toLower() == QLatin1String("swf")) {
         entry.source = IconSource::Flash;

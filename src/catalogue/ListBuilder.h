@@ -31,6 +31,10 @@ public:
     // description, the file title; first non-empty wins.
     QString RawDisplayName(const QString& path) const;
 
+    // The picture the list shows for an icon file (an entry's iconFile, for an entry whose picture was left
+    // for later); null when the file holds none.
+    static QImage ShownPicture(const QString& iconFile);
+
     // The command line lists without pictures: it needs only the decision, not the images.
     void setKeepPictures(bool keep) { m_keepPictures = keep; }
 

@@ -61,9 +61,9 @@ public:
     // The same on a screen of more device pixels than units: the image that fills the cell's real pixels,
     // with that pixel ratio; BestIconPicture's choice on an ordinary screen.
     QImage ScreenIconPicture();
-    // The image ScreenIconPicture would decode, for decoding when it is first shown: only where the picture is
-    // that image as it stands and its layout is sound, so that decoding it later cannot fail; else empty.
-    QByteArray ScreenImageToDecodeLater();
+    // True when ScreenIconPicture is sure to give a picture without decoding it now: the picture is the best
+    // image as it stands, and that image's layout is sound.
+    bool ScreenPictureIsSound();
     QImage IconPicture(int nIndex) const;
     // Colour bits and AND mask composed into one picture with transparency; null on failure.
     QImage IconHandle(int nIndex) const;

@@ -46,14 +46,12 @@ int cFileIcon::sharpIconIndex(int wantedPixels, int wantedDepth) const
     return best;
 }
 
-QByteArray cFileIcon::ScreenImageToDecodeLater()
+bool cFileIcon::ScreenPictureIsSound()
 {
     if (m_entries.isEmpty() || displayPixelRatio() > 1.0)
-        return {};
+        return false;
     const int index = bestIconIndex(displayDepth());
-    if (index < 1 || index > m_images.size() || !IconImageDecoder::IsSoundBitmap(m_images.at(index - 1)))
-        return {};
-    return m_images.at(index - 1);
+    return index >= 1 && index <= m_images.size() && IconImageDecoder::IsSoundBitmap(m_images.at(index - 1));
 }
 
 QImage cFileIcon::ScreenIconPicture()

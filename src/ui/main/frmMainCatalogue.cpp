@@ -8,7 +8,6 @@
 #include "catalogue/IconCacheBuilder.h"
 #include "catalogue/ListBuilder.h"
 #include "catalogue/ListOrder.h"
-#include "icons/IconImageDecoder.h"
 #include "icons/NumberedError.h"
 #include "store/PlayHistory.h"
 #include "support/PathFunctions.h"
@@ -115,9 +114,8 @@ void frmMain::addListItem(const GameEntry& entry)
     switch (entry.source) {
     case IconSource::File:
     case IconSource::Cache:
-        if (!entry.pictureImage.isEmpty()) {
-            m_listView->Add(
-                [image = entry.pictureImage] { return QPixmap::fromImage(IconImageDecoder::DecodePicture(image)); },
+        if (entry.pictureLater) {
+            m_listView->Add([file = entry.iconFile] { return QPixmap::fromImage(ListBuilder::ShownPicture(file)); },
                 entry.caption, entry.path);
             return;
         }
