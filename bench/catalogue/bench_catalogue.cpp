@@ -69,7 +69,16 @@ void measure(int installed, const QByteArray& exe, const QByteArray& icon)
     qsizetype walked = 0;
     qsizetype found = 0;
     runFind(locations.gamesFolder); // warm the cache for both
-    const double walk = medianMilliseconds(7, [&] { walked = discovery.InstalledGameFiles({}).size(); });
+    const double walk = medianMilliseconds(7, [&] {
+        QStringList files;
+        discovery.ForEachInstalledGameFile(
+            [&files](const QString& file) {
+                files.append(file);
+                return true;
+            },
+            {});
+        walked = files.size();
+    });
     const double reference = medianMilliseconds(7, [&] { found = runFind(locations.gamesFolder); });
     if (walked != installed || found != installed)
         QTextStream(stderr) << "walk found " << walked << ", find " << found << ", expected " << installed << '\n';

@@ -70,20 +70,6 @@ bool GameDiscovery::ForEachInstalledGameFile(const FileSink& found, const Discov
     return true;
 }
 
-QStringList GameDiscovery::InstalledGameFiles(const std::function<bool()>& stopRequested) const
-{
-    QStringList files;
-    DiscoveryHooks hooks;
-    hooks.stopRequested = stopRequested;
-    const bool walked = ForEachInstalledGameFile(
-        [&files](const QString& file) {
-            files.append(file);
-            return true;
-        },
-        hooks);
-    return walked ? files : QStringList();
-}
-
 QStringList GameDiscovery::WindowsGameFiles() const
 {
     return WindowsGames::Files(m_locations);

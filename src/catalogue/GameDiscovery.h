@@ -41,8 +41,6 @@ public:
     // folder, each with every folder below it, in walk order, each handed to `found` as soon as its folder
     // is listed. False when stopped.
     bool ForEachInstalledGameFile(const FileSink& found, const DiscoveryHooks& hooks) const;
-    // The same files at once. Empty when stopped.
-    QStringList InstalledGameFiles(const std::function<bool()>& stopRequested) const;
     // The classic games of the Windows folder, the Microsoft Games (or Gaming Zone) folder, Pinball.
     QStringList WindowsGameFiles() const;
 

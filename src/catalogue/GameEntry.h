@@ -23,8 +23,8 @@ struct GameEntry {
     QString path; // the item's data string, exactly as discovery passed it
     IconSource source = IconSource::Queued;
     QString iconFile; // the .ico that gave the picture, for File and Cache
-    QImage picture; // that picture, unless the builder was told not to keep pictures
-    bool pictureLater = false; // or, for a sound icon file, made from it when the list first shows it
+    QImage picture; // that picture, unless the builder was told not to keep pictures; null also when the
+                    // list is to make it from iconFile when it first shows the game
 };
 
 } // namespace Brimvault

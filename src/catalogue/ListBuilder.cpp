@@ -118,10 +118,8 @@ void ListBuilder::chooseIcon(GameEntry& entry) const
     if (found.usable) {
         entry.source = hasOwnIcon ? IconSource::File : IconSource::Cache;
         entry.iconFile = candidate;
-        if (m_keepPictures) {
-            entry.pictureLater = found.picture.isNull();
+        if (m_keepPictures)
             entry.picture = std::move(found.picture);
-        }
     } else if (GetFileExtention(entry.path, false, false).toLower() == QLatin1String("swf")) {
         entry.source = IconSource::Flash;
     } else {

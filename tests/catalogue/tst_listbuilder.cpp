@@ -87,7 +87,7 @@ private Q_SLOTS:
         };
         // The window decodes a sound bitmap image when it first shows it.
         const auto shownWidth = [](const GameEntry& entry) {
-            return entry.pictureLater ? ListBuilder::ShownPicture(entry.iconFile).width() : entry.picture.width();
+            return entry.picture.isNull() ? ListBuilder::ShownPicture(entry.iconFile).width() : entry.picture.width();
         };
         // Every image's header zeroed: the directory is sound, no image can be drawn.
         const auto damagedImages = [](QByteArray icon) {
@@ -120,8 +120,7 @@ private Q_SLOTS:
                 + (entry.iconFile == ownFile          ? u" own"_s
                         : entry.iconFile == cacheFile ? u" cache"_s
                                                       : entry.iconFile)
-                + (bare.source == entry.source && bare.picture.isNull() && !bare.pictureLater ? QString()
-                                                                                              : u" differs bare"_s);
+                + (bare.source == entry.source && bare.picture.isNull() ? QString() : u" differs bare"_s);
         };
         // Each takes the first source that has a name: user, info file, zone table, version text, file title.
         QTest::newRow("user name first") << caption(u"hrtzzm.exe"_s, {}, "My Hearts", "<>Name<Info Hearts")

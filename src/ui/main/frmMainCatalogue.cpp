@@ -114,16 +114,12 @@ void frmMain::addListItem(const GameEntry& entry)
     switch (entry.source) {
     case IconSource::File:
     case IconSource::Cache:
-        if (entry.pictureLater) {
+        if (entry.picture.isNull())
             m_listView->Add([file = entry.iconFile] { return QPixmap::fromImage(ListBuilder::ShownPicture(file)); },
                 entry.caption, entry.path);
-            return;
-        }
-        if (!entry.picture.isNull()) {
+        else
             m_listView->Add(QPixmap::fromImage(entry.picture), entry.caption, entry.path);
-            return;
-        }
-        break;
+        return;
     case IconSource::Flash:
         m_listView->Add(m_imgSWF->Picture(), entry.caption, entry.path);
         return;
