@@ -1,6 +1,7 @@
 #include "app/startup/CommandLine.h"
 #include "app/startup/WidgetPrompts.h"
 #include "app/startup/modMain.h"
+#include "media/MediaHostEntry.h"
 #include "media/WebEngineStartup.h"
 #include "store/SettingsStore.h"
 
@@ -26,6 +27,10 @@ int main(int argc, char* argv[])
         return *exitCode;
 
     InstallWidgetPrompts();
+#ifdef Q_OS_WIN
+    // A DLL could not share the program's state the way a module does here: Windows links the host in.
+    MediaHost::Provide(MediaHostEntryPoints());
+#endif
     modMain::Main();
 
     // Main has shown the main window, or has told the user why it cannot and there is nothing to run.

@@ -4,6 +4,7 @@
 #include "i18n/modLocalizer.h"
 #include "media/BrowserEmulation.h"
 #include "media/HostPages.h"
+#include "media/MediaHost.h"
 #include "media/MediaHostFiles.h"
 #include "media/MediaKind.h"
 #include "media/ReclamaPicture.h"
@@ -214,7 +215,7 @@ QWebEngineView* frmReclama::createBrowser()
 bool frmReclama::LoadFlashMovie(const QString& file)
 {
     if (!MediaHostFiles::WebEngineAvailable() || !MediaHostFiles::RuffleInstalled()) {
-        showMissingControl(QStringLiteral("Macromedia Shockwave Flash Control not installed properly."));
+        MediaHost::ReportFlashMissing();
         m_mode = ModeNothing;
         return false;
     }
@@ -268,7 +269,7 @@ void frmReclama::reportFlashMissing()
     // The message is all the user sees, not Ruffle's own error drawn in the player.
     if (m_flash)
         m_flash->hide();
-    showMissingControl(QStringLiteral("Macromedia Shockwave Flash Control not installed properly."));
+    MediaHost::ReportFlashMissing();
     close();
 }
 

@@ -55,7 +55,8 @@ endforeach()
 execute_process(COMMAND ${dpkg-deb_exe} -c ${deb} OUTPUT_VARIABLE listing)
 set(expected
     usr/bin/brimvault usr/bin/BrimvaultService usr/games/brimvault
-    usr/lib/brimvault/brimvault usr/lib/brimvault/BrimvaultService usr/lib/brimvault/ruffle-host.html
+    usr/lib/brimvault/brimvault usr/lib/brimvault/brimvault-media.so usr/lib/brimvault/BrimvaultService
+    usr/lib/brimvault/ruffle-host.html
     usr/lib/brimvault/ruffle/ruffle.js
     usr/lib/brimvault/Quillet.so usr/lib/brimvault/Tamarisk.so usr/lib/brimvault/Velloran.so
     usr/lib/brimvault/Ostrane.so usr/lib/brimvault/Corvelle.so

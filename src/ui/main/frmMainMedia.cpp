@@ -2,42 +2,37 @@
 // when it closes.
 #include "ui/main/frmMain.h"
 
-#ifdef BRIMVAULT_WITH_MEDIA
-#include "media/ReclamaOnClose.h"
-#include "media/frmReclama.h"
-#endif
-
+#include "media/MediaHost.h"
 #include "store/PlayHistory.h"
 
-#include <QCoreApplication>
 #include <QElapsedTimer>
-
-#include <memory>
 
 namespace Brimvault {
 
 void frmMain::connectMediaHost()
 {
-#ifdef BRIMVAULT_WITH_MEDIA
     connect(this, &frmMain::flashMovieRequested, this, [](const QString& path, const QString& caption) {
-        auto* host = new frmReclama;
+        const MediaHost::EntryPoints* media = MediaHost::Get();
+        if (!media) {
+            MediaHost::ReportFlashMissing();
+            return;
+        }
         // A movie is played for as long as its window is open.
-        auto clock = std::make_shared<QElapsedTimer>();
-        clock->start();
-        connect(host, &QObject::destroyed, QCoreApplication::instance(),
-            [clock, path] { PlayHistory::AddPlayTime(path, (clock->elapsed() + 500) / 1000); });
-        host->RunGame(path, caption);
+        QElapsedTimer clock;
+        clock.start();
+        media->runGame(
+            path, caption, [clock, path] { PlayHistory::AddPlayTime(path, (clock.elapsed() + 500) / 1000); });
     });
-#endif
 }
 
 void frmMain::showDueReclama(ReclamaSchedule::UnloadMode mode)
 {
-#ifdef BRIMVAULT_WITH_MEDIA
-    ShowDueReclama(mode);
-#else
-    Q_UNUSED(mode);
-#endif
+    // The schedule is read first: the host is loaded only when there is something to show.
+    const std::optional<ReclamaSchedule::DueReclama> due = ReclamaSchedule::ReclamaToShow(mode);
+    if (!due)
+        return;
+    if (const MediaHost::EntryPoints* media = MediaHost::Get())
+        media->showReclama(*due);
 }
 
 } // namespace Brimvault

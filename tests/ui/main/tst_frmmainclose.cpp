@@ -2,6 +2,7 @@
 #include "AdvertisingFiles.h"
 #include "MainWindowFixture.h"
 #include "TestEnvironment.h"
+#include "media/MediaHostEntry.h"
 #include "media/WebEngineStartup.h"
 #include "media/frmReclama.h"
 #include "store/DataFolders.h"
@@ -56,6 +57,7 @@ int main(int argc, char* argv[])
 {
     PrepareWebEngine();
     QApplication app(argc, argv);
+    MediaHost::Provide(MediaHostEntryPoints());
     TestFrmMainClose test;
     return QTest::qExec(&test, argc, argv);
 }

@@ -1,0 +1,35 @@
+#include "media/MediaHostEntry.h"
+
+#include "media/frmReclama.h"
+
+#include <QPointer>
+
+namespace Brimvault {
+
+namespace {
+
+void runGame(const QString& path, const QString& caption, std::function<void()> closed)
+{
+    auto* host = new frmReclama;
+    QObject::connect(host, &QObject::destroyed, std::move(closed));
+    host->RunGame(path, caption);
+}
+
+bool showReclama(const ReclamaSchedule::DueReclama& due)
+{
+    QPointer<frmReclama> window = new frmReclama();
+    window->SetReclamaCaption();
+    window->ReclamaShow(due.filePath, due.address);
+    return window && window->isVisible();
+}
+
+const MediaHost::EntryPoints entryPoints {runGame, showReclama};
+
+} // namespace
+
+const MediaHost::EntryPoints* MediaHostEntryPoints()
+{
+    return &entryPoints;
+}
+
+} // namespace Brimvault
