@@ -7,6 +7,7 @@
 #include "catalogue/ListedPaths.h"
 #include "catalogue/WindowsGames.h"
 #include "support/PathFunctions.h"
+#include "support/TextCase.h"
 
 #include <QScopeGuard>
 
@@ -30,7 +31,7 @@ bool GameDiscovery::ForEachInstalledGameFile(const FileSink& found, const Discov
 {
     // Folders are compared with these ignoring case: folded once here and once per folder, which costs far
     // less than a case-insensitive comparison on every folder of a large library.
-    const QString gamesFolder = m_locations.gamesFolder.toCaseFolded();
+    const QString gamesFolder = CaseFolded(m_locations.gamesFolder);
     const QString advertisingFolder
         = gamesFolder.isEmpty() ? QString() : gamesFolder + QStringLiteral("reclama") + gamesFolder.back();
     const auto handFiles = [&](const FolderWalk::WalkedFolder& folder) {
@@ -47,7 +48,7 @@ bool GameDiscovery::ForEachInstalledGameFile(const FileSink& found, const Discov
             if (stopped(hooks.stopRequested) || !found(folder.path + name))
                 return false;
         }
-        const QString foldedPath = folder.path.toCaseFolded();
+        const QString foldedPath = CaseFolded(folder.path);
         const bool inGamesFolder
             = !gamesFolder.isEmpty() && foldedPath.startsWith(gamesFolder) && !foldedPath.startsWith(advertisingFolder);
         if (!inGamesFolder)
@@ -105,14 +106,14 @@ DiscoveryResult GameDiscovery::Run(const DiscoveryHooks& hooks)
         if (hooks.clearList)
             hooks.clearList();
         const GameEntry online = m_builder.OnlineGamesEntry();
-        listedPaths.append(online.path.toUpper());
+        listedPaths.append(UpperCased(online.path));
         return handOn(online);
     };
     const bool walked = ForEachInstalledGameFile(
         [&](const QString& path) {
             if (!startList())
                 return false;
-            listedPaths.append(path.toUpper());
+            listedPaths.append(UpperCased(path));
             return handOn(m_builder.AddGameToList(path));
         },
         hooks);
@@ -124,7 +125,7 @@ DiscoveryResult GameDiscovery::Run(const DiscoveryHooks& hooks)
         return result;
 
     for (const QString& path : WindowsGameFiles()) {
-        listedPaths.append(path.toUpper());
+        listedPaths.append(UpperCased(path));
         if (!handOn(m_builder.AddGameToList(path)))
             return result;
     }
@@ -134,7 +135,7 @@ DiscoveryResult GameDiscovery::Run(const DiscoveryHooks& hooks)
     const auto addedGames = m_builder.addedGames().games();
     for (const auto& game : addedGames) {
         const QString path = game.path.trimmed();
-        if (listedPaths.containsPiece(path.toUpper()))
+        if (listedPaths.containsPiece(UpperCased(path)))
             continue;
         if (!handOn(m_builder.AddGameToList(path)))
             return result;

@@ -3,6 +3,7 @@
 #include "app/clsFileVersion.h"
 #include "catalogue/CatalogueLocations.h"
 #include "support/PathFunctions.h"
+#include "support/TextCase.h"
 
 namespace Brimvault::GameFileRules {
 
@@ -12,7 +13,7 @@ namespace {
 // search, a tenth of its cost, which a walk over thousands of file names notices.
 bool containsInstallerWord(const QString& text)
 {
-    const QString folded = text.toCaseFolded();
+    const QString folded = CaseFolded(text);
     return folded.contains(QLatin1String("setup")) || folded.contains(QLatin1String("install"));
 }
 
@@ -26,7 +27,7 @@ QString ExclusionText()
 bool IsExcludedName(const QString& name)
 {
     static const QString exclusions = ExclusionText().toCaseFolded();
-    return exclusions.contains(name.toCaseFolded());
+    return exclusions.contains(CaseFolded(name));
 }
 
 bool LooksLikeInstaller(const QString& name)

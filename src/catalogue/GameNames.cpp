@@ -2,6 +2,7 @@
 
 #include "i18n/PublisherGames.h"
 #include "i18n/modLocalizer.h"
+#include "support/TextCase.h"
 
 #include <QStringList>
 
@@ -52,7 +53,7 @@ QString publisherName(const QString& fileTitle)
 
 QString BuiltInName(const QString& fileTitle)
 {
-    const QString title = fileTitle.toUpper();
+    const QString title = UpperCased(fileTitle);
     // Membership is a substring test, so a title such as "zm" is a member that matches no row.
     static const QString membership = kZoneMembership.toString().toUpper();
     if (membership.contains(title))

@@ -3,6 +3,7 @@
 #include "i18n/LanguageEncoding.h"
 #include "i18n/modLocalizer.h"
 #include "support/PathFunctions.h"
+#include "support/TextCase.h"
 
 #include <limits>
 
@@ -38,7 +39,7 @@ QString IconCacheKey(const QString& path)
             return QString();
     }
     // Upper-casing never makes a separator or a dot, so the title may be cut out first: a path is longer.
-    return GetFileName(path, false).toUpper() + QString::number(odd) + QString::number(even);
+    return UpperCased(GetFileName(path, false)) + QString::number(odd) + QString::number(even);
 }
 
 QString IconCacheFile(const QString& iconsFolder, const QString& path)

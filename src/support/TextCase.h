@@ -1,0 +1,13 @@
+#pragma once
+
+#include <QString>
+
+namespace Brimvault {
+
+// QString::toUpper and toCaseFolded, with the same results, but a plain loop when the text is ASCII: the
+// general conversion looks every character up in the Unicode tables, which a pass over thousands of paths
+// notices.
+QString UpperCased(const QString& text);
+QString CaseFolded(const QString& text);
+
+} // namespace Brimvault
