@@ -2,6 +2,7 @@
 
 #include "store/CatalogueKeys.h"
 #include "store/SettingsStore.h"
+#include "support/TextCase.h"
 
 namespace Brimvault {
 
@@ -9,7 +10,7 @@ namespace {
 
 QString normalised(const QString& path)
 {
-    return path.trimmed().toLower();
+    return LowerCased(path.trimmed());
 }
 
 } // namespace

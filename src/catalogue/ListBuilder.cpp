@@ -10,6 +10,7 @@
 #include "icons/cFileIcon.h"
 #include "store/InfoFiles.h"
 #include "support/PathFunctions.h"
+#include "support/TextCase.h"
 
 namespace Brimvault {
 
@@ -17,7 +18,7 @@ namespace {
 
 QString knownPathOf(const QString& path)
 {
-    return path.trimmed().toLower();
+    return LowerCased(path.trimmed());
 }
 
 // Whether an icon file is there and holds a usable picture, and that picture. Where the picture is sure to

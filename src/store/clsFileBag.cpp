@@ -2,6 +2,7 @@
 
 #include "store/BagFileIo.h"
 #include "store/SettingsStore.h"
+#include "support/TextCase.h"
 
 namespace Brimvault {
 
@@ -17,7 +18,7 @@ qsizetype findKey(const QString& text, const QString& key, qsizetype from)
         return -1;
     if (key.isEmpty())
         return from;
-    return text.indexOf(key, from, Qt::CaseInsensitive);
+    return IndexOfIgnoringCase(text, key, from);
 }
 
 // The CR LF separated line that holds position p: [start, end), end never before start.
@@ -60,6 +61,9 @@ QString clsFileBag::escapeText(const QString& text)
 
 QString clsFileBag::unescapeText(const QString& text)
 {
+    // Every escape starts with a backslash; most values have none.
+    if (!text.contains(u'\\'))
+        return text;
     QString plain = text;
     plain.replace(QStringLiteral("\\{[}\\"), QStringLiteral("<"), Qt::CaseInsensitive);
     plain.replace(QStringLiteral("\\{]}\\"), QStringLiteral(">"), Qt::CaseInsensitive);

@@ -40,16 +40,26 @@ QString GetFileExtention(const QString& path, bool withWildcard, bool withSemico
 
 QString GetFileName(const QString& path, bool withExtension)
 {
-    const QString text = withBackslashes(path);
-    const qsizetype slash = lastPosition(text, u'\\');
-    const qsizetype dot = lastPosition(text, u'.');
+    // One pass from the end over the text before any query, without the copy that turns slashes into
+    // backslashes: the name lies after the last separator of either kind, so the copy would not change it.
+    const qsizetype query = path.indexOf(u'?');
+    const QStringView text = query < 0 ? QStringView(path) : QStringView(path).left(query);
+    qsizetype slash = 0;
+    qsizetype dot = 0;
+    for (qsizetype position = text.size(); position > 0 && slash == 0; --position) {
+        const QChar character = text.at(position - 1);
+        if (character == u'\\' || character == u'/')
+            slash = position;
+        else if (character == u'.' && dot == 0)
+            dot = position;
+    }
     QString name;
     if (dot > slash)
-        name = text.mid(slash, dot - slash - 1);
+        name = text.mid(slash, dot - slash - 1).toString();
     else if (dot < slash)
-        name = text.mid(slash);
+        name = text.mid(slash).toString();
     else
-        name = text;
+        name = text.toString();
     if (withExtension)
         name += u'.' + GetFileExtention(path, false, false);
     return name;
