@@ -48,25 +48,15 @@ bool samePicture(const QPixmap& a, const QPixmap& b)
         && a.toImage().convertToFormat(QImage::Format_ARGB32) == b.toImage().convertToFormat(QImage::Format_ARGB32);
 }
 
-// Counts the list's paints that show more than one game before the fill has ended.
-class PaintsWhileFilling : public QObject {
+// Counts the paints of a list that shows more than one game.
+class ListPaints : public QObject {
 public:
-    explicit PaintsWhileFilling(frmMain* window)
-        : m_list(window->ListView1())
+    bool eventFilter(QObject* list, QEvent* event) override
     {
-        m_list->installEventFilter(this);
-        connect(window, &frmMain::listRebuilt, this, [this] { m_filled = true; });
-    }
-    bool eventFilter(QObject*, QEvent* event) override
-    {
-        count += !m_filled && event->type() == QEvent::Paint && m_list->loadedCount() > 1;
+        count += event->type() == QEvent::Paint && static_cast<SimpleListView*>(list)->loadedCount() > 1;
         return false;
     }
     int count = 0;
-
-private:
-    SimpleListView* m_list;
-    bool m_filled = false;
 };
 
 } // namespace
@@ -137,9 +127,7 @@ private Q_SLOTS:
         const QStringList captions = column(list);
         const auto picture = [&](const QString& name) { return list->imgN(int(captions.indexOf(name))).Picture(); };
         QCOMPARE(captions.size(), 8);
-        QCOMPARE(QStringList({captions.first(), list->labN(0).tag()}),
-            QStringList({u"Online games"_s, u"http://127.0.0.1:9/online-games-catalog.asp"_s}));
-        QCOMPARE(QStringList({captions.last(), list->labN(7).tag()}), QStringList({u"My Puzzle"_s, added}));
+        QCOMPARE(list->labN(7).tag(), added);
         QVERIFY(samePicture(list->imgN(0).Picture(), window->imgOnLine()->Picture()));
         for (const QString& name : {u"Color Lines"_s, u"Happy Farm"_s, u"My Puzzle"_s})
             QVERIFY2(!picture(name).isNull(), qPrintable(name));
@@ -281,11 +269,14 @@ private Q_SLOTS:
         for (int i = 0; i < 100; ++i) // more than a window shows
             QVERIFY(WriteFile(m_env->path(u"commonappdata/Brimvault/Game %1/game%1.exe"_s.arg(i))));
         frmMain window;
-        PaintsWhileFilling paints(&window);
+        ListPaints paints;
+        window.ListView1()->installEventFilter(&paints);
+        int whileFilling = 0;
+        connect(&window, &frmMain::listRebuilt, this, [&] { whileFilling = paints.count; });
         QSignalSpy rebuilt(&window, &frmMain::listRebuilt);
         window.show();
         QVERIFY(rebuilt.wait(20000));
-        QVERIFY(paints.count > 0);
+        QVERIFY(whileFilling > 0);
     }
 
     // Closed while its own loading lets events run: the window goes, once.

@@ -113,17 +113,14 @@ private Q_SLOTS:
         QMenu* menu = m_window->mnuActions();
         while (menu->activeAction()->objectName() != u"mnuLanguage"_s)
             QTest::keyClick(menu, Qt::Key_Down);
-        QString seenTitle;
         bool comboHadFocus = false;
         WhenModalShows([&](QWidget* modal) {
-            seenTitle = modal->windowTitle();
             comboHadFocus = qobject_cast<QComboBox*>(modal->focusWidget()) != nullptr;
             QTest::keyClick(modal, Qt::Key_Escape);
         });
         QSignalSpy rebuilt(m_window.get(), &frmMain::listRebuilt);
         QTest::keyClick(menu, Qt::Key_Return);
         QVERIFY(rebuilt.count() > 0 || rebuilt.wait(10000));
-        QCOMPARE(seenTitle, u"Program language"_s);
         QVERIFY(comboHadFocus);
     }
 
