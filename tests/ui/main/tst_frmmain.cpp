@@ -84,7 +84,8 @@ class TestFrmMain : public QObject {
         return seen;
     }
 
-    // Chooses a language in the dialog; returns the dialog's title, its languages and the one it started at.
+    // Chooses a language in the dialog by keys alone; returns the dialog's title, its languages and the one it
+    // started at.
     QStringList chooseLanguage(frmMain* window, int entry)
     {
         QStringList seen;
@@ -94,8 +95,10 @@ class TestFrmMain : public QObject {
             for (int i = 0; i < dialog->cbLanguages()->count(); ++i)
                 seen << dialog->cbLanguages()->itemText(i);
             seen << QString::number(dialog->cbLanguages()->currentIndex());
-            dialog->cbLanguages()->setCurrentIndex(entry);
-            QTest::mouseClick(dialog->cmdOK(), Qt::LeftButton);
+            QVERIFY(dialog->focusWidget() == dialog->cbLanguages());
+            for (int i = dialog->cbLanguages()->currentIndex(); i != entry; i += entry > i ? 1 : -1)
+                QTest::keyClick(dialog->cbLanguages(), entry > i ? Qt::Key_Down : Qt::Key_Up);
+            QTest::keyClick(dialog->cbLanguages(), Qt::Key_Return);
         });
         window->menuItem(u"mnuLanguage"_s)->trigger();
         return seen;
