@@ -187,16 +187,13 @@ private Q_SLOTS:
         const QStringList russian = captions();
         for (qsizetype i = 1; i < english.size(); ++i)
             QVERIFY2(i == 3 || i == 4 || russian.value(i) != english.at(i), qPrintable(english.at(i)));
-        // Names from the games' information files, and the publisher's own names by file title.
-        QStringList names = column(window->ListView1());
-        QCOMPARE(names.value(0), u"Онлайн-игры"_s);
-        QVERIFY(names.contains(u"Цветные линии"_s) && names.contains(u"Змейка"_s) && !names.contains(u"Color Lines"_s));
+        // The list is built again, in the language.
+        QCOMPARE(column(window->ListView1()).value(0), u"Онлайн-игры"_s);
         // The dialog speaks the language in force and starts at it, whatever the letter case of the stored name.
         SaveSetting(AppTitle(), u"LocaleSettings"_s, u"LngFileName"_s, u"brimvault_RUSSIAN.LNG"_s);
         const QStringList again = chooseLanguage(window.get(), 0);
         QCOMPARE(QStringList({again.value(0), again.value(4)}), QStringList({u"Язык программы"_s, u"2"_s}));
         QCOMPARE(captions(), english);
-        QVERIFY(column(window->ListView1()).contains(u"Color Lines"_s));
         QCOMPARE(rebuilt.count(), 2);
         QVERIFY(m_prompts->prompts.isEmpty());
         // Without language files only a message shows, and the list is filled again all the same.
