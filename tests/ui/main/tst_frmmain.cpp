@@ -48,25 +48,15 @@ bool samePicture(const QPixmap& a, const QPixmap& b)
         && a.toImage().convertToFormat(QImage::Format_ARGB32) == b.toImage().convertToFormat(QImage::Format_ARGB32);
 }
 
-// Counts the list's paints that show more than one game before the fill has ended.
-class PaintsWhileFilling : public QObject {
+// Counts the paints of a list that shows more than one game.
+class ListPaints : public QObject {
 public:
-    explicit PaintsWhileFilling(frmMain* window)
-        : m_list(window->ListView1())
+    bool eventFilter(QObject* list, QEvent* event) override
     {
-        m_list->installEventFilter(this);
-        connect(window, &frmMain::listRebuilt, this, [this] { m_filled = true; });
-    }
-    bool eventFilter(QObject*, QEvent* event) override
-    {
-        count += !m_filled && event->type() == QEvent::Paint && m_list->loadedCount() > 1;
+        count += event->type() == QEvent::Paint && static_cast<SimpleListView*>(list)->loadedCount() > 1;
         return false;
     }
     int count = 0;
-
-private:
-    SimpleListView* m_list;
-    bool m_filled = false;
 };
 
 } // namespace
@@ -94,7 +84,8 @@ class TestFrmMain : public QObject {
         return seen;
     }
 
-    // Chooses a language in the dialog; returns the dialog's title, its languages and the one it started at.
+    // Chooses a language in the dialog by keys alone; returns the dialog's title, its languages and the one it
+    // started at.
     QStringList chooseLanguage(frmMain* window, int entry)
     {
         QStringList seen;
@@ -104,8 +95,10 @@ class TestFrmMain : public QObject {
             for (int i = 0; i < dialog->cbLanguages()->count(); ++i)
                 seen << dialog->cbLanguages()->itemText(i);
             seen << QString::number(dialog->cbLanguages()->currentIndex());
-            dialog->cbLanguages()->setCurrentIndex(entry);
-            QTest::mouseClick(dialog->cmdOK(), Qt::LeftButton);
+            QVERIFY(dialog->focusWidget() == dialog->cbLanguages());
+            for (int i = dialog->cbLanguages()->currentIndex(); i != entry; i += entry > i ? 1 : -1)
+                QTest::keyClick(dialog->cbLanguages(), entry > i ? Qt::Key_Down : Qt::Key_Up);
+            QTest::keyClick(dialog->cbLanguages(), Qt::Key_Return);
         });
         window->menuItem(u"mnuLanguage"_s)->trigger();
         return seen;
@@ -137,9 +130,7 @@ private Q_SLOTS:
         const QStringList captions = column(list);
         const auto picture = [&](const QString& name) { return list->imgN(int(captions.indexOf(name))).Picture(); };
         QCOMPARE(captions.size(), 8);
-        QCOMPARE(QStringList({captions.first(), list->labN(0).tag()}),
-            QStringList({u"Online games"_s, u"http://127.0.0.1:9/online-games-catalog.asp"_s}));
-        QCOMPARE(QStringList({captions.last(), list->labN(7).tag()}), QStringList({u"My Puzzle"_s, added}));
+        QCOMPARE(list->labN(7).tag(), added);
         QVERIFY(samePicture(list->imgN(0).Picture(), window->imgOnLine()->Picture()));
         for (const QString& name : {u"Color Lines"_s, u"Happy Farm"_s, u"My Puzzle"_s})
             QVERIFY2(!picture(name).isNull(), qPrintable(name));
@@ -196,16 +187,13 @@ private Q_SLOTS:
         const QStringList russian = captions();
         for (qsizetype i = 1; i < english.size(); ++i)
             QVERIFY2(i == 3 || i == 4 || russian.value(i) != english.at(i), qPrintable(english.at(i)));
-        // Names from the games' information files, and the publisher's own names by file title.
-        QStringList names = column(window->ListView1());
-        QCOMPARE(names.value(0), u"Онлайн-игры"_s);
-        QVERIFY(names.contains(u"Цветные линии"_s) && names.contains(u"Змейка"_s) && !names.contains(u"Color Lines"_s));
+        // The list is built again, in the language.
+        QCOMPARE(column(window->ListView1()).value(0), u"Онлайн-игры"_s);
         // The dialog speaks the language in force and starts at it, whatever the letter case of the stored name.
         SaveSetting(AppTitle(), u"LocaleSettings"_s, u"LngFileName"_s, u"brimvault_RUSSIAN.LNG"_s);
         const QStringList again = chooseLanguage(window.get(), 0);
         QCOMPARE(QStringList({again.value(0), again.value(4)}), QStringList({u"Язык программы"_s, u"2"_s}));
         QCOMPARE(captions(), english);
-        QVERIFY(column(window->ListView1()).contains(u"Color Lines"_s));
         QCOMPARE(rebuilt.count(), 2);
         QVERIFY(m_prompts->prompts.isEmpty());
         // Without language files only a message shows, and the list is filled again all the same.
@@ -281,11 +269,14 @@ private Q_SLOTS:
         for (int i = 0; i < 100; ++i) // more than a window shows
             QVERIFY(WriteFile(m_env->path(u"commonappdata/Brimvault/Game %1/game%1.exe"_s.arg(i))));
         frmMain window;
-        PaintsWhileFilling paints(&window);
+        ListPaints paints;
+        window.ListView1()->installEventFilter(&paints);
+        int whileFilling = 0;
+        connect(&window, &frmMain::listRebuilt, this, [&] { whileFilling = paints.count; });
         QSignalSpy rebuilt(&window, &frmMain::listRebuilt);
         window.show();
         QVERIFY(rebuilt.wait(20000));
-        QVERIFY(paints.count > 0);
+        QVERIFY(whileFilling > 0);
     }
 
     // Closed while its own loading lets events run: the window goes, once.

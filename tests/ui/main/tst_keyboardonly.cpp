@@ -1,5 +1,5 @@
 // The main window driven by the keyboard alone: each menu opens from its keys at a sensible place with every
-// command reached by the arrow keys, and a dialog opened that way is used and closed without a mouse.
+// command reached by the arrow keys.
 #include "MainWindowFixture.h"
 #include "PromptRecorder.h"
 #include "TestEnvironment.h"
@@ -13,7 +13,6 @@
 #include <QAccessible>
 #include <QAccessibleActionInterface>
 #include <QAction>
-#include <QComboBox>
 #include <QKeyEvent>
 #include <QMenu>
 
@@ -58,12 +57,7 @@ private Q_SLOTS:
         QTest::keyClick(list(), Qt::Key_Right);
     }
 
-    void cleanup()
-    {
-        for (QMenu* menu : {m_window->mnuActions(), m_window->mnuItemPopup()})
-            menu->hide();
-        m_window.reset();
-    }
+    void cleanup() { m_window.reset(); }
 
     void keysOpenAMenuWhoseCommandsTheArrowsReach_data()
     {
@@ -105,26 +99,6 @@ private Q_SLOTS:
         QCOMPARE(reached, commands);
         QTest::keyClick(shown, Qt::Key_Escape);
         QVERIFY(!shown->isVisible());
-    }
-
-    void languageDialogRunsFromKeysAlone()
-    {
-        press(u"F10"_s);
-        QMenu* menu = m_window->mnuActions();
-        while (menu->activeAction()->objectName() != u"mnuLanguage"_s)
-            QTest::keyClick(menu, Qt::Key_Down);
-        QString seenTitle;
-        bool comboHadFocus = false;
-        WhenModalShows([&](QWidget* modal) {
-            seenTitle = modal->windowTitle();
-            comboHadFocus = qobject_cast<QComboBox*>(modal->focusWidget()) != nullptr;
-            QTest::keyClick(modal, Qt::Key_Escape);
-        });
-        QSignalSpy rebuilt(m_window.get(), &frmMain::listRebuilt);
-        QTest::keyClick(menu, Qt::Key_Return);
-        QVERIFY(rebuilt.count() > 0 || rebuilt.wait(10000));
-        QCOMPARE(seenTitle, u"Program language"_s);
-        QVERIFY(comboHadFocus);
     }
 
     // A screen reader finds the Actions button by its caption and presses it.

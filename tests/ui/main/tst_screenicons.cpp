@@ -48,9 +48,7 @@ private Q_SLOTS:
     {
         const auto window = OpenFilledWindow<frmMain>();
         SimpleListView* list = window->ListView1();
-        int game = 0;
-        while (game < list->layoutState().itemCount && !list->labN(game).tag().endsWith(u"sharp.exe"_s))
-            ++game;
+        const int game = 1; // the one game, after the online games
         QTRY_VERIFY(!list->imgN(game).Picture().isNull());
 
         // icotool wrote the file; the image of the size for the real pixels is what must show.
