@@ -1,6 +1,7 @@
 #include "support/CommandLine.h"
 #include "support/PathFunctions.h"
 #include "support/SystemFolders.h"
+#include "support/TextCase.h"
 #include "support/modShelAndWaitl.h"
 
 #include "PromptRecorder.h"
@@ -158,6 +159,15 @@ private Q_SLOTS:
         QTest::newRow("slash, slash style") << AddSlash(u"C:\\a/b"_qs) << u"C:\\a/b/"_qs;
         QTest::newRow("slash, bare word") << AddSlash(u"dir"_qs) << u".\\dir\\"_qs;
         QTest::newRow("slash, query cut") << AddSlash(u"C:\\a?b\\"_qs) << u"C:\\a\\"_qs;
+        QTest::newRow("upper, ASCII edges") << UpperCased(u"`az{ @AZ["_qs) << u"`AZ{ @AZ["_qs;
+        QTest::newRow("lower, ASCII edges") << LowerCased(u"@AZ[ `az{"_qs) << u"@az[ `az{"_qs;
+        QTest::newRow("fold, ASCII edges") << CaseFolded(u"@AZ[ `az{"_qs) << u"@az[ `az{"_qs;
+        QTest::newRow("upper beyond ASCII") << UpperCased(u"straße ä"_qs) << u"STRASSE Ä"_qs;
+        QTest::newRow("fold beyond ASCII") << CaseFolded(u"Ä\u212A"_qs) << u"äk"_qs;
+        QTest::newRow("found ignoring case")
+            << QString::number(IndexOfIgnoringCase(u"<>ab<>NAME<x"_qs, u"<>Name<"_qs, 1)) << u"4"_qs;
+        QTest::newRow("Kelvin sign is a k")
+            << QString::number(IndexOfIgnoringCase(u"<>\u212Aey<"_qs, u"<>KEY<"_qs, 0)) << u"0"_qs;
     }
     void paths()
     {
