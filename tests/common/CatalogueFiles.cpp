@@ -3,9 +3,8 @@
 #include "icons/cFileIcon.h"
 
 #include "PeFixtures.h"
+#include "TestFiles.h"
 
-#include <QDir>
-#include <QFile>
 #include <QFileInfo>
 
 QString CatalogueFixture(const QString& name)
@@ -15,9 +14,7 @@ QString CatalogueFixture(const QString& name)
 
 bool CopyFixture(const QString& fixture, const QString& path)
 {
-    QDir().mkpath(QFileInfo(path).absolutePath());
-    QFile::remove(path);
-    return QFileInfo::exists(fixture) && QFile::copy(fixture, path);
+    return QFileInfo::exists(fixture) && WriteFile(path, ReadFile(fixture));
 }
 
 QByteArray ValidIconFile()

@@ -1,6 +1,7 @@
 #pragma once
 
-#include <QDir>
+#include "TestFiles.h"
+
 #include <QFile>
 #include <QList>
 #include <QString>
@@ -30,8 +31,5 @@ inline QList<LaunchRecord> ReadLaunchRecords(const QString& recordFolder, const 
 // Copies the recorder to path under another name, keeping it executable.
 inline bool InstallRecorder(const QString& recorder, const QString& path)
 {
-    QDir().mkpath(path.left(path.lastIndexOf(u'/')));
-    QFile::remove(path);
-    return QFile::copy(recorder, path)
-        && QFile::setPermissions(path, QFile::permissions(path) | QFileDevice::ExeOwner | QFileDevice::ExeUser);
+    return QFile::exists(recorder) && WriteExecutable(path, ReadFile(recorder));
 }

@@ -86,12 +86,6 @@ QString SamplePath(int i)
     return u"/games/g%1/run.exe"_s.arg(i);
 }
 
-static bool writeIconFile(const QString& path, const QColor& color)
-{
-    QDir().mkpath(QFileInfo(path).absolutePath());
-    return GamePicture(color).toImage().convertToFormat(QImage::Format_ARGB32).save(path, "ICO");
-}
-
 QString BuildSampleLibrary(const TestEnvironment& environment)
 {
     // folder, file title, English name, Russian name, icon colour
@@ -101,6 +95,10 @@ QString BuildSampleLibrary(const TestEnvironment& environment)
         {"Chess 3D", "chess3d", "Chess 3D", "Шахматы 3D", "#3c3c46"},
     };
     const QString gamesFolder = environment.path(u"commonappdata/Brimvault/"_s);
+    const auto writeIconFile = [](const QString& path, const QColor& color) {
+        QDir().mkpath(QFileInfo(path).absolutePath());
+        GamePicture(color).toImage().convertToFormat(QImage::Format_ARGB32).save(path, "ICO");
+    };
     for (const auto& game : games) {
         const QString stem = gamesFolder + QString::fromUtf8(game[0]) + u'/' + QString::fromUtf8(game[1]);
         WriteFile(stem + u".exe"_s);
@@ -129,10 +127,9 @@ void WhenModalShows(const std::function<void(QWidget*)>& act)
 {
     auto* poll = new QTimer(qApp);
     poll->setInterval(10);
-    auto tries = std::make_shared<int>(0);
-    QObject::connect(poll, &QTimer::timeout, qApp, [poll, act, tries] {
+    QObject::connect(poll, &QTimer::timeout, qApp, [poll, act, tries = 0]() mutable {
         QWidget* modal = QApplication::activeModalWidget();
-        if (!modal && ++*tries < 500)
+        if (!modal && ++tries < 500)
             return;
         poll->stop();
         poll->deleteLater();

@@ -18,10 +18,8 @@ void failMissing(const QString& what, const char* package)
 
 std::optional<QByteArray> run(const QString& program, const QStringList& arguments, const char* package)
 {
-    // The system's python3 first: the one on PATH may lack the Debian packages.
-    QString path = QStandardPaths::findExecutable(program, {QStringLiteral("/usr/bin")});
-    if (path.isEmpty())
-        path = QStandardPaths::findExecutable(program);
+    // The system's python3: the one first on PATH may lack the Debian packages.
+    const QString path = QStandardPaths::findExecutable(program, {QStringLiteral("/usr/bin")});
     if (path.isEmpty()) {
         failMissing(program, package);
         return std::nullopt;

@@ -6,8 +6,6 @@
 #include <QFile>
 #include <QSet>
 
-namespace Brimvault {
-
 QStringList RealPeFiles(const QStringList& firstFolders, int maxFiles)
 {
     QStringList roots = firstFolders;
@@ -38,5 +36,3 @@ QStringList RealPeFiles(const QStringList& firstFolders, int maxFiles)
     files.sort();
     return files;
 }
-
-} // namespace Brimvault

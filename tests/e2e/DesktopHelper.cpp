@@ -4,10 +4,9 @@
 //   close WINDOW-ID   asks a window to close as a window manager does for its close button
 #include <QApplication>
 #include <QDrag>
-#include <QLabel>
 #include <QMimeData>
-#include <QMouseEvent>
 #include <QPixmap>
+#include <QPushButton>
 #include <QScreen>
 #include <QTimer>
 #include <QUrl>
@@ -16,36 +15,8 @@
 
 #include <cstring>
 
-namespace {
-
-class DragSource : public QLabel {
-public:
-    explicit DragSource(const QString& file)
-        : QLabel(QStringLiteral("Drag me"))
-        , m_file(file)
-    {
-        setWindowTitle(QStringLiteral("Brimvault drag source"));
-        setGeometry(10, 10, 220, 120);
-    }
-
-protected:
-    void mousePressEvent(QMouseEvent*) override
-    {
-        auto* mime = new QMimeData;
-        mime->setUrls({QUrl::fromLocalFile(m_file)});
-        auto* drag = new QDrag(this);
-        drag->setMimeData(mime);
-        drag->exec(Qt::CopyAction | Qt::MoveAction | Qt::LinkAction, Qt::CopyAction);
-        // The target fetches the data after the drop: the source stays until it surely has.
-        QTimer::singleShot(10000, qApp, &QCoreApplication::quit);
-    }
-
-private:
-    QString m_file;
-};
-
 // The WM_DELETE_WINDOW message a window manager sends when the user clicks a window's close button.
-int closeWindow(xcb_window_t window)
+static int closeWindow(xcb_window_t window)
 {
     xcb_connection_t* connection = xcb_connect(nullptr, nullptr);
     const auto atom = [connection](const char* name) {
@@ -70,8 +41,6 @@ int closeWindow(xcb_window_t window)
     return result;
 }
 
-} // namespace
-
 int main(int argc, char** argv)
 {
     const QByteArray command = argc == 3 ? argv[1] : "";
@@ -82,7 +51,18 @@ int main(int argc, char** argv)
         return QGuiApplication::primaryScreen()->grabWindow(0).save(QString::fromLocal8Bit(argv[2]), "PNG") ? 0 : 2;
     if (command != "drag")
         return 1;
-    DragSource source(QString::fromLocal8Bit(argv[2]));
+    QPushButton source(QStringLiteral("Drag me"));
+    source.setWindowTitle(QStringLiteral("Brimvault drag source"));
+    source.setGeometry(10, 10, 220, 120);
+    QObject::connect(&source, &QPushButton::pressed, [&] {
+        auto* mime = new QMimeData;
+        mime->setUrls({QUrl::fromLocalFile(QString::fromLocal8Bit(argv[2]))});
+        auto* drag = new QDrag(&source);
+        drag->setMimeData(mime);
+        drag->exec(Qt::CopyAction | Qt::MoveAction | Qt::LinkAction, Qt::CopyAction);
+        // The target fetches the data after the drop: the source stays until it surely has.
+        QTimer::singleShot(10000, &app, &QCoreApplication::quit);
+    });
     source.show();
     return app.exec();
 }
