@@ -90,8 +90,7 @@ private Q_SLOTS:
         m_env.reset();
     }
 
-    // Refused before anything is written; the name rules are the validator's table, a name reaching outside the
-    // end-to-end test's.
+    // Refused before anything is written, the games folder included; the name rules are the validator's table.
     void refused_data()
     {
         QTest::addColumn<QString>("kind");
@@ -118,7 +117,6 @@ private Q_SLOTS:
         for (qsizetype i = 0; i + 1 < settings.size(); i += 2)
             QVERIFY(SaveSetting(AppTitle(), CatalogueKeys::SettingsSection, settings.at(i), settings.at(i + 1)));
         const QString package = m_packages + u"/package.bvxpak"_s;
-        // Nor is the games folder made.
         QVERIFY2(QDir(m_games).removeRecursively() && (kind.isEmpty() || craftPackage(kind, package)), "needs python3");
         const auto before = SnapshotTree(m_env->root());
         QString output;

@@ -283,8 +283,8 @@ private Q_SLOTS:
                     ok ? env.programDir() + u'/' + CompanionComponentFile(Prefixes[i]) : QString());
         }
         QCOMPARE(GetAllSettings(AppTitle(), u"Settings"_s).size(), usable);
-        const QStringList message {u"You need to run the program as administrator!"_s};
-        QCOMPARE(prompts.texts(), usable == 5 ? QStringList() : message);
+        QCOMPARE(prompts.texts(),
+            usable == 5 ? QStringList() : QStringList {u"You need to run the program as administrator!"_s});
         modMain::Main();
         QCOMPARE(visibleMainWindows(), usable == 5 ? 1 : 0);
     }

@@ -216,7 +216,6 @@ private Q_SLOTS:
             << addTo("Count=5\nFile2147483647=/m\nFile1=/1") << u"File2|2147483647|3"_s;
         QTest::newRow("counter in any case, blanks") << addTo(" COUNT =1\nFile1=/1") << u"File2|2|2"_s;
         QTest::newRow("Counter is an entry") << addTo("Counter=/c") << u"File1|1|2"_s;
-        QTest::newRow("path in other case") << lookUp(u"c:\\games\\lines.exe"_s) << u"File2|File2|3"_s;
         QTest::newRow("path with blanks") << lookUp(u"\tC:\\Games\\Lines.EXE  "_s) << u"File2|File2|3"_s;
         QTest::newRow("non-ASCII path") << lookUp(u"/ИГРЫ/линии.EXE"_s) << u"File4|File4|3"_s;
         QTest::newRow("inner blank differs") << lookUp(u"C:\\Games\\Li nes.exe"_s) << u"||3"_s;
