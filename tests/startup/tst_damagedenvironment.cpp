@@ -108,7 +108,6 @@ private Q_SLOTS:
         QTest::addColumn<bool>("runs");
         const QString file = u"settings/Brimvault.ini"_s;
         const QString lock = u"settings/Brimvault.ini.lock"_s;
-        const QString intact = u"intact"_s;
         const QByteArray none;
         QTest::newRow("named pipe in the file's place") << file << u"pipe"_s << none << none << false;
         QTest::newRow("settings folder is a file") << u"settings"_s << u"text"_s << none << none << false;
@@ -117,13 +116,10 @@ private Q_SLOTS:
         // Kept elsewhere by the user (a folder of dotfiles, say): written through, the link stays.
         QTest::newRow("link to the user's own file")
             << file << u"link personal/dotfiles/Brimvault.ini"_s << none << none << true;
-        // Random bytes: NULs, invalid UTF-8 and line ends spread through them.
-        QTest::newRow("binary garbage before the sections") << file << intact << RandomBytes(64 * 1024, 20261121) + '\n'
-                                                            << none << true;
-        QTest::newRow("10 MB line") << file << intact << none << "; " + QByteArray(10 * 1024 * 1024, 'x') + '\n'
-                                    << true;
-        QTest::newRow("cut off in the middle of a line")
-            << file << intact << none << QByteArray("[LocaleSettings]\nLngFileN") << true;
+        // Random bytes (NULs, invalid UTF-8, line ends) before the sections; a 10 MB line and a cut-off one after.
+        QTest::newRow("garbage, long line, cut off")
+            << file << u"intact"_s << RandomBytes(64 * 1024, 20261121) + '\n'
+            << "; " + QByteArray(10 * 1024 * 1024, 'x') + "\n[LocaleSettings]\nLngFileN" << true;
     }
     void damagedSettingsFile()
     {

@@ -104,26 +104,23 @@ private Q_SLOTS:
 
     void needsNoDisplay_data()
     {
-        QTest::addColumn<QStringList>("arguments");
+        QTest::addColumn<QByteArrayList>("argv");
         QTest::addColumn<bool>("noDisplay");
-        QTest::newRow("no arguments") << QStringList() << false;
-        QTest::newRow("command") << QStringList {u"--version"_s} << true;
-        QTest::newRow("unknown option") << QStringList {u"--bogus"_s} << true;
-        QTest::newRow("plain word") << QStringList {u"game.exe"_s} << true;
-        QTest::newRow("Qt option, one dash") << QStringList {u"-style"_s, u"fusion"_s} << false;
-        QTest::newRow("Qt option, two dashes") << QStringList {u"--platform"_s, u"xcb"_s} << false;
-        QTest::newRow("Qt option with value") << QStringList {u"--style=fusion"_s} << false;
+        QTest::newRow("no arguments") << QByteArrayList {"brimvault"} << false;
+        QTest::newRow("command") << QByteArrayList {"brimvault", "--version"} << true;
+        QTest::newRow("unknown option") << QByteArrayList {"brimvault", "--bogus"} << true;
+        QTest::newRow("plain word") << QByteArrayList {"brimvault", "game.exe"} << true;
+        QTest::newRow("Qt option, one dash") << QByteArrayList {"brimvault", "-style", "fusion"} << false;
+        QTest::newRow("Qt option, two dashes") << QByteArrayList {"brimvault", "--platform", "xcb"} << false;
+        QTest::newRow("Qt option with value") << QByteArrayList {"brimvault", "--style=fusion"} << false;
     }
     void needsNoDisplay()
     {
-        QFETCH(QStringList, arguments);
-        QList<QByteArray> storage {"brimvault"};
-        for (const QString& argument : arguments)
-            storage.append(argument.toLocal8Bit());
-        std::vector<const char*> argv;
-        for (const QByteArray& argument : storage)
-            argv.push_back(argument.constData());
-        QTEST(CommandLine::NeedsNoDisplay(int(argv.size()), argv.data()), "noDisplay");
+        QFETCH(QByteArrayList, argv);
+        std::vector<const char*> pointers;
+        for (const QByteArray& argument : argv)
+            pointers.push_back(argument.constData());
+        QTEST(CommandLine::NeedsNoDisplay(int(pointers.size()), pointers.data()), "noDisplay");
     }
 
     void realProgram_data()
@@ -286,8 +283,8 @@ private Q_SLOTS:
                     ok ? env.programDir() + u'/' + CompanionComponentFile(Prefixes[i]) : QString());
         }
         QCOMPARE(GetAllSettings(AppTitle(), u"Settings"_s).size(), usable);
-        const QStringList message {u"You need to run the program as administrator!"_s};
-        QCOMPARE(prompts.texts(), usable == 5 ? QStringList() : message);
+        QCOMPARE(prompts.texts(),
+            usable == 5 ? QStringList() : QStringList {u"You need to run the program as administrator!"_s});
         modMain::Main();
         QCOMPARE(visibleMainWindows(), usable == 5 ? 1 : 0);
     }
@@ -332,14 +329,13 @@ private Q_SLOTS:
         QCOMPARE(stampOf(ComponentRegistryPath()), registryBefore);
     }
 
-    // Without a program folder named, the program finds its components beside itself.
+    // Without a program folder named, the program finds its components beside itself: a missing one would stop
+    // start-up before the window.
     void realProgramFindsItsComponents()
     {
         TestEnvironment env;
         const ProgramOutcome outcome = RunProgram(env, QString());
         QVERIFY2(outcome.showedWindow(), qPrintable(outcome.describe()));
-        for (const QString& prefix : Prefixes)
-            QCOMPARE(savedVersion(prefix), QStringLiteral(BRIMVAULT_VERSION));
     }
 };
 

@@ -1,6 +1,0 @@
-#include "TestSuite.h"
-
-int main(int argc, char** argv)
-{
-    return RunRegisteredTests(argc, argv);
-}
