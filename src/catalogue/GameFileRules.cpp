@@ -30,8 +30,7 @@ QString ExclusionText()
 
 bool IsExcludedName(const QString& name)
 {
-    static const QString exclusions = ExclusionText();
-    return containsIgnoringCase(exclusions, name);
+    return containsIgnoringCase(ExclusionText(), name);
 }
 
 bool LooksLikeInstaller(const QString& name)

@@ -17,8 +17,8 @@ namespace MediaHost {
 struct EntryPoints {
     // Plays the movie or page at `path`; `closed` runs when its window has gone, however it ended.
     void (*runGame)(const QString& path, const QString& caption, std::function<void()> closed);
-    // True when the window shows the advertisement; every failure passes quietly.
-    bool (*showReclama)(const ReclamaSchedule::DueReclama& due);
+    // Shows the advertisement; every failure passes quietly.
+    void (*showReclama)(const ReclamaSchedule::DueReclama& due);
 };
 
 // The name the module exports its entry points under; the number changes with EntryPoints.

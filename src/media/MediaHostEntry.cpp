@@ -2,8 +2,6 @@
 
 #include "media/frmReclama.h"
 
-#include <QPointer>
-
 namespace Brimvault {
 
 namespace {
@@ -15,12 +13,11 @@ void runGame(const QString& path, const QString& caption, std::function<void()> 
     host->RunGame(path, caption);
 }
 
-bool showReclama(const ReclamaSchedule::DueReclama& due)
+void showReclama(const ReclamaSchedule::DueReclama& due)
 {
-    QPointer<frmReclama> window = new frmReclama();
+    auto* window = new frmReclama;
     window->SetReclamaCaption();
     window->ReclamaShow(due.filePath, due.address);
-    return window && window->isVisible();
 }
 
 const MediaHost::EntryPoints entryPoints {runGame, showReclama};
