@@ -14,15 +14,18 @@ int main(int argc, char* argv[])
 {
     using namespace Brimvault;
 
-    if (CommandLine::NeedsNoDisplay(argc, argv) && qEnvironmentVariableIsEmpty("QT_QPA_PLATFORM"))
-        qputenv("QT_QPA_PLATFORM", "offscreen");
+    QCoreApplication::setApplicationName(AppTitle());
+    QCoreApplication::setApplicationVersion(QStringLiteral(BRIMVAULT_VERSION));
+    if (CommandLine::NeedsNoDisplay(argc, argv)) {
+        // A command prints and ends: no window system, styles or fonts to load first.
+        QCoreApplication app(argc, argv);
+        return CommandLine::Dispatch(QCoreApplication::arguments().mid(1)).value_or(CommandLine::UsageExitCode);
+    }
 
     PrepareWebEngine();
     QApplication app(argc, argv);
-    QApplication::setApplicationName(AppTitle());
-    QApplication::setApplicationVersion(QStringLiteral(BRIMVAULT_VERSION));
     QGuiApplication::setDesktopFileName(QStringLiteral("io.brimvault.Brimvault"));
-
+    // Qt's own options come first and are taken out by now; a command may follow them.
     if (const std::optional<int> exitCode = CommandLine::Dispatch(QApplication::arguments().mid(1)))
         return *exitCode;
 

@@ -5,6 +5,8 @@
 #include "support/PathFunctions.h"
 #include "support/TextCase.h"
 
+#include <charconv>
+#include <iterator>
 #include <limits>
 
 namespace Brimvault {
@@ -24,30 +26,63 @@ int EightBitCode(QChar character, int codePage)
     return code < 0 ? int(u'?') : code;
 }
 
-QString IconCacheKey(const QString& path)
+namespace {
+
+void appendNumber(QString& to, qint64 number)
 {
-    qint64 odd = 0;
-    qint64 even = 0;
+    char digits[24];
+    const auto written = std::to_chars(std::begin(digits), std::end(digits), number);
+    to += QLatin1StringView(digits, written.ptr - digits);
+}
+
+// Appends the key to `to`; false, leaving `to` as it was, when a sum leaves the signed 32-bit range. The
+// list asks for a key per game, so it is written straight into the caller's text.
+bool appendKey(QString& to, const QString& path)
+{
+    // The sums at the odd positions (1, 3, ...) and at the even ones; ASCII is its own code in every page.
+    qint64 sums[2] = {0, 0};
     constexpr qint64 limit = std::numeric_limits<qint32>::max();
     int codePage = 0;
+    const char16_t* chars = reinterpret_cast<const char16_t*>(path.constData());
     for (qsizetype i = 0; i < path.size(); ++i) {
-        const QChar character = path.at(i);
-        if (character.unicode() >= 0x80 && codePage == 0)
-            codePage = SystemCodePage();
-        (i % 2 == 0 ? odd : even) += EightBitCode(character, codePage);
-        if (odd > limit || even > limit)
-            return QString();
+        qint64& sum = sums[i % 2];
+        if (chars[i] < 0x80) {
+            sum += chars[i];
+        } else {
+            if (codePage == 0)
+                codePage = SystemCodePage();
+            sum += EightBitCode(QChar(chars[i]), codePage);
+        }
+        if (sum > limit)
+            return false;
     }
     // Upper-casing never makes a separator or a dot, so the title may be cut out first: a path is longer.
-    return UpperCased(GetFileName(path, false)) + QString::number(odd) + QString::number(even);
+    to += UpperCased(GetFileName(path, false));
+    appendNumber(to, sums[0]);
+    appendNumber(to, sums[1]);
+    return true;
+}
+
+} // namespace
+
+QString IconCacheKey(const QString& path)
+{
+    QString key;
+    return appendKey(key, path) ? key : QString();
 }
 
 QString IconCacheFile(const QString& iconsFolder, const QString& path)
 {
-    const QString key = IconCacheKey(path);
-    if (iconsFolder.isEmpty() || key.isEmpty())
+    if (iconsFolder.isEmpty())
         return QString();
-    return iconsFolder + key + QStringLiteral(".ico");
+    QString file;
+    // The title, two numbers of up to ten digits and the extension fit in the path's length and thirty more.
+    file.reserve(iconsFolder.size() + path.size() + 30);
+    file += iconsFolder;
+    if (!appendKey(file, path))
+        return QString();
+    file += QLatin1StringView(".ico");
+    return file;
 }
 
 } // namespace Brimvault

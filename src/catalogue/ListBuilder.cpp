@@ -95,7 +95,8 @@ QString ListBuilder::rawDisplayName(const QString& path, const QString& knownPat
 {
     QString name = m_addedGames.userNameOfKnownPath(knownPath);
     if (name.isEmpty()) {
-        const QString found = findSideFile(InfoFiles::GameInfoFileName(path));
+        const InfoFiles::InfoFileParts info = InfoFiles::GameInfoFileParts(path);
+        const QString found = m_sideFiles.find(info.folder, info.name);
         if (!found.isEmpty())
             name = InfoFiles::ReadGameName(found, m_languageTag);
     }

@@ -7,12 +7,23 @@ namespace {
 constexpr qsizetype RunLength = 4;
 constexpr int TableBits = 20;
 
-quint64 runHash(const QChar* run)
+quint64 tableBit(quint64 run)
 {
-    quint64 packed = 0;
-    for (qsizetype i = 0; i < RunLength; ++i)
-        packed = (packed << 16) | run[i].unicode();
-    return (packed * 0x9E3779B97F4A7C15ull) >> (64 - TableBits);
+    return (run * 0x9E3779B97F4A7C15ull) >> (64 - TableBits);
+}
+
+// Calls `visit` with the table bit of every four-character run of the text, each run packed into 64 bits;
+// one character shifts in and the oldest falls out at each step.
+template <typename Visit>
+bool forEachRun(const QChar* chars, qsizetype size, Visit visit)
+{
+    quint64 run = 0;
+    for (qsizetype i = 0; i < size; ++i) {
+        run = (run << 16) | chars[i].unicode();
+        if (i + 1 >= RunLength && !visit(tableBit(run)))
+            return false;
+    }
+    return true;
 }
 
 } // namespace
@@ -31,22 +42,16 @@ void ListedPaths::append(const QString& upperPath)
 
 void ListedPaths::noteRunsFrom(qsizetype start)
 {
-    const QChar* chars = m_text.constData();
-    for (qsizetype i = start; i + RunLength <= m_text.size(); ++i) {
-        const quint64 bit = runHash(chars + i);
+    forEachRun(m_text.constData() + start, m_text.size() - start, [this](quint64 bit) {
         m_runs[bit / 64] |= quint64(1) << (bit % 64);
-    }
+        return true;
+    });
 }
 
 bool ListedPaths::mayContain(const QString& text) const
 {
-    const QChar* chars = text.constData();
-    for (qsizetype i = 0; i + RunLength <= text.size(); ++i) {
-        const quint64 bit = runHash(chars + i);
-        if (!(m_runs[bit / 64] & (quint64(1) << (bit % 64))))
-            return false;
-    }
-    return true;
+    return forEachRun(text.constData(), text.size(),
+        [this](quint64 bit) { return (m_runs[bit / 64] & (quint64(1) << (bit % 64))) != 0; });
 }
 
 bool ListedPaths::containsPiece(const QString& text) const

@@ -81,6 +81,7 @@ void cFileIcon::reset(const QString& sFileName)
     m_resourceId = QVariant();
     m_entries.clear();
     m_images.clear();
+    m_fileBytes.clear();
     m_idReserved = 0;
     m_idType = 0;
     m_idCount = 0;
@@ -120,6 +121,10 @@ bool cFileIcon::LoadIcon(const QString& sFileName)
 
     bool failed = false;
     readUpTo(IconHeaderSize + IconDirEntrySize * m_idCount);
+    m_entries.reserve(qMin<qsizetype>(m_idCount, (bytes.size() - IconHeaderSize) / IconDirEntrySize));
+    m_images.reserve(m_entries.capacity());
+    // The images read with the directory stay where they are: each refers into these bytes, not a copy.
+    m_fileBytes = bytes;
     for (int i = 0; i < m_idCount; ++i) {
         const qint64 at = IconHeaderSize + IconDirEntrySize * i;
         if (bytes.size() < at + IconDirEntrySize) {
@@ -136,8 +141,8 @@ bool cFileIcon::LoadIcon(const QString& sFileName)
         const qint64 size = entry.dwBytesInRes;
         const bool fits = offset <= fileSize && size <= fileSize - offset;
         QByteArray image;
-        if (fits && offset + size <= bytes.size())
-            image = bytes.sliced(offset, size);
+        if (fits && offset + size <= m_fileBytes.size())
+            image = QByteArray::fromRawData(m_fileBytes.constData() + offset, size);
         else if (fits)
             image = file.readAt(offset, size);
         if (!fits || image.size() < size) {
@@ -150,6 +155,7 @@ bool cFileIcon::LoadIcon(const QString& sFileName)
     if (failed) {
         m_entries.clear();
         m_images.clear();
+        m_fileBytes.clear();
         m_idCount = 0;
         return false;
     }
@@ -211,6 +217,7 @@ void cFileIcon::CloneTo(cFileIcon& target) const
     target.m_idCount = m_idCount;
     target.m_entries = m_entries;
     target.m_images.clear();
+    target.m_fileBytes.clear();
     for (const QByteArray& image : m_images)
         target.m_images.append(QByteArray(image.constData(), image.size()));
 }
@@ -231,7 +238,11 @@ const IconDirEntry& cFileIcon::entry(int nIndex) const
 QByteArray cFileIcon::imageBytes(int nIndex) const
 {
     checkIndex(nIndex);
-    return nIndex <= m_images.size() ? m_images.at(nIndex - 1) : QByteArray();
+    if (nIndex > m_images.size())
+        return {};
+    // A copy of its own: the image may refer into bytes this icon lets go of on its next load.
+    const QByteArray& image = m_images.at(nIndex - 1);
+    return QByteArray(image.constData(), image.size());
 }
 
 int cFileIcon::ImageWidth(int nIndex) const

@@ -103,6 +103,8 @@ private:
     qint16 m_idCount = 0;
     QList<IconDirEntry> m_entries;
     QList<QByteArray> m_images;
+    // The bytes LoadIcon read at once; the images found in them refer into them.
+    QByteArray m_fileBytes;
     int m_displayDepth = 0;
     QString m_lastLoadMessage;
 };

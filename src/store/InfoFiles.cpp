@@ -8,11 +8,6 @@ namespace Brimvault::InfoFiles {
 
 namespace {
 
-qsizetype lastSeparator(const QString& path)
-{
-    return qMax(path.lastIndexOf(u'\\'), path.lastIndexOf(u'/'));
-}
-
 // The value of the one-part record, trimmed; whitespace also covers a final line end written by an
 // editor that ends lines with LF only.
 QString recordValue(const clsFileBag& bag, const QString& part)
@@ -39,14 +34,22 @@ const NameKeys& nameKeysFor(const QString& lngNik)
 
 } // namespace
 
+InfoFileParts GameInfoFileParts(const QString& gamePath)
+{
+    QStringView path(gamePath);
+    if (const qsizetype query = path.indexOf(u'?'); query >= 0)
+        path = path.left(query);
+    const qsizetype separator = qMax(path.lastIndexOf(u'\\'), path.lastIndexOf(u'/'));
+    const QStringView name = path.sliced(separator + 1);
+    const qsizetype dot = name.lastIndexOf(u'.');
+    return {separator < 0 ? QStringLiteral(".\\") : path.left(separator + 1).toString(),
+        (dot < 0 ? name : name.left(dot)) + CatalogueKeys::InfoFileExtension};
+}
+
 QString GameInfoFileName(const QString& gamePath)
 {
-    const QString path = clsFileBag::LeftTo(gamePath, QStringLiteral("?"));
-    const qsizetype separator = lastSeparator(path);
-    const QString folder = separator < 0 ? QStringLiteral(".\\") : path.left(separator + 1);
-    const QString name = path.mid(separator + 1);
-    const qsizetype dot = name.lastIndexOf(u'.');
-    return folder + (dot < 0 ? name : name.left(dot)) + CatalogueKeys::InfoFileExtension;
+    const InfoFileParts parts = GameInfoFileParts(gamePath);
+    return parts.folder + parts.name;
 }
 
 QString GameInfoName(const QString& gamePath, const QString& lngNik)

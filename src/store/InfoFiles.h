@@ -9,6 +9,12 @@ namespace Brimvault::InfoFiles {
 // The game's info file: the path cut at its first "?", the extension of its file name replaced by
 // ".bvxinf", in the same folder ("/" and "\" both separate folders; a bare name lies in ".\").
 QString GameInfoFileName(const QString& gamePath);
+// The same as its folder (with its separator) and its name, apart.
+struct InfoFileParts {
+    QString folder;
+    QString name;
+};
+InfoFileParts GameInfoFileParts(const QString& gamePath);
 
 // The display name from the game's info file: the record "Name_" + lngNik, else "Name", both trimmed;
 // empty when there is no info file or neither record has a value.
