@@ -28,3 +28,6 @@ struct GameEntry {
 };
 
 } // namespace Brimvault
+
+// Its members move as plain bytes, so a growing list of thousands of games moves them without copying each.
+Q_DECLARE_TYPEINFO(Brimvault::GameEntry, Q_RELOCATABLE_TYPE);

@@ -66,12 +66,6 @@ void ListBuilder::endPass()
     m_sideFiles.clear();
 }
 
-QString ListBuilder::findSideFile(const QString& file) const
-{
-    const qsizetype separator = qMax(file.lastIndexOf(u'/'), file.lastIndexOf(u'\\'));
-    return m_sideFiles.find(file.left(separator + 1), file.mid(separator + 1));
-}
-
 QImage ListBuilder::ShownPicture(const QString& iconFile)
 {
     return pictureOf(iconFile, false).picture;
@@ -113,7 +107,9 @@ QString ListBuilder::rawDisplayName(const QString& path, const QString& knownPat
 
 void ListBuilder::chooseIcon(GameEntry& entry) const
 {
-    const QString ownIcon = findSideFile(GetFileFolder(entry.path, true) + QStringLiteral(".ico"));
+    // The game's own icon lies beside it under the game's file title; a title never holds a separator.
+    const QString ownIcon
+        = m_sideFiles.find(GetFileFolder(entry.path, false), GetFileName(entry.path, false) + QLatin1String(".ico"));
     const bool hasOwnIcon = !ownIcon.isEmpty();
     const QString candidate = hasOwnIcon ? ownIcon : IconCacheFile(m_iconsFolder, entry.path);
     IconPicture found = pictureOf(candidate, true);

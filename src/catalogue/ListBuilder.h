@@ -45,8 +45,6 @@ public:
 private:
     QString rawDisplayName(const QString& path, const QString& knownPath) const;
     void chooseIcon(GameEntry& entry) const;
-    // The file as spelled on disk, found in its folder without regard to case; empty when missing.
-    QString findSideFile(const QString& file) const;
 
     QString m_iconsFolder;
     QString m_languageTag;

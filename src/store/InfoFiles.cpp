@@ -42,8 +42,11 @@ InfoFileParts GameInfoFileParts(const QString& gamePath)
     const qsizetype separator = qMax(path.lastIndexOf(u'\\'), path.lastIndexOf(u'/'));
     const QStringView name = path.sliced(separator + 1);
     const qsizetype dot = name.lastIndexOf(u'.');
-    return {separator < 0 ? QStringLiteral(".\\") : path.left(separator + 1).toString(),
-        (dot < 0 ? name : name.left(dot)) + CatalogueKeys::InfoFileExtension};
+    const QStringView title = dot < 0 ? name : name.left(dot);
+    QString fileName;
+    fileName.reserve(title.size() + CatalogueKeys::InfoFileExtension.size());
+    fileName.append(title).append(CatalogueKeys::InfoFileExtension);
+    return {separator < 0 ? QStringLiteral(".\\") : path.left(separator + 1).toString(), fileName};
 }
 
 QString GameInfoFileName(const QString& gamePath)

@@ -32,8 +32,12 @@ public:
     bool failed() const { return m_failed; }
 
 private:
+#ifdef Q_OS_WIN
     struct Handle;
     std::unique_ptr<Handle> m_handle;
+#else
+    int m_descriptor = -1; // a plain descriptor: no allocation for each of the list's many files
+#endif
     State m_state = State::Missing;
     qint64 m_size = 0;
     bool m_failed = false;

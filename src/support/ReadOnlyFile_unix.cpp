@@ -9,12 +9,7 @@
 
 namespace Brimvault {
 
-struct ReadOnlyFile::Handle {
-    int descriptor = -1;
-};
-
 ReadOnlyFile::ReadOnlyFile(const QString& path)
-    : m_handle(std::make_unique<Handle>())
 {
     if (path.isEmpty())
         return;
@@ -31,15 +26,15 @@ ReadOnlyFile::ReadOnlyFile(const QString& path)
         m_state = State::NotReadable;
         return;
     }
-    m_handle->descriptor = descriptor;
+    m_descriptor = descriptor;
     m_size = status.st_size;
     m_state = State::Open;
 }
 
 ReadOnlyFile::~ReadOnlyFile()
 {
-    if (m_handle->descriptor >= 0)
-        ::close(m_handle->descriptor);
+    if (m_descriptor >= 0)
+        ::close(m_descriptor);
 }
 
 QByteArray ReadOnlyFile::readAt(qint64 offset, qint64 count)
@@ -49,7 +44,7 @@ QByteArray ReadOnlyFile::readAt(qint64 offset, qint64 count)
     QByteArray bytes(count, Qt::Uninitialized);
     ssize_t got = -1;
     do
-        got = ::pread(m_handle->descriptor, bytes.data(), size_t(count), offset);
+        got = ::pread(m_descriptor, bytes.data(), size_t(count), offset);
     while (got < 0 && errno == EINTR);
     // A regular file reads short only at its end, so one call is enough.
     m_failed = m_failed || got < 0;
