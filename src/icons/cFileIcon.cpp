@@ -33,17 +33,18 @@ qint64 rowBytes(qint64 bits)
     return ((bits + 31) / 32) * 4;
 }
 
-IconDirEntry readEntry(const ByteReader& reader, qint64 at)
+// The 16 bytes at `at`, which the caller has made sure are there.
+IconDirEntry readEntry(const char* at)
 {
     IconDirEntry entry;
-    entry.bWidth = *reader.u8(at);
-    entry.bHeight = *reader.u8(at + 1);
-    entry.bColorCount = *reader.u8(at + 2);
-    entry.bReserved = *reader.u8(at + 3);
-    entry.wPlanes = *reader.u16(at + 4);
-    entry.wBitCount = *reader.u16(at + 6);
-    entry.dwBytesInRes = *reader.u32(at + 8);
-    entry.dwImageOffset = *reader.u32(at + 12);
+    entry.bWidth = quint8(at[0]);
+    entry.bHeight = quint8(at[1]);
+    entry.bColorCount = quint8(at[2]);
+    entry.bReserved = quint8(at[3]);
+    entry.wPlanes = qFromLittleEndian<quint16>(at + 4);
+    entry.wBitCount = qFromLittleEndian<quint16>(at + 6);
+    entry.dwBytesInRes = qFromLittleEndian<quint32>(at + 8);
+    entry.dwImageOffset = qFromLittleEndian<quint32>(at + 12);
     return entry;
 }
 
@@ -132,7 +133,7 @@ bool cFileIcon::LoadIcon(const QString& sFileName)
             failed = true;
             break;
         }
-        m_entries.append(readEntry(ByteReader(QByteArrayView(bytes)), at));
+        m_entries.append(readEntry(bytes.constData() + at));
     }
     for (qsizetype i = 0; i < m_entries.size() && !failed; ++i) {
         const IconDirEntry& entry = m_entries.at(i);
