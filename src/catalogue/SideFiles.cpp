@@ -15,24 +15,31 @@ bool isSideFile(const QString& name)
 
 } // namespace
 
-void SideFiles::remember(const QString& folder, const QStringList& files)
+QStringList SideFiles::sideFilesAmong(const QStringList& files)
 {
-    QStringList& names = m_folders[folder];
-    names.clear();
+    QStringList names;
     for (const QString& file : files) {
         if (isSideFile(file))
             names.append(file);
     }
+    return names;
+}
+
+void SideFiles::remember(const QString& folder, const QStringList& files)
+{
+    m_walked = {folder, sideFilesAmong(files)};
 }
 
 QString SideFiles::find(const QString& folder, const QString& name)
 {
-    auto known = m_folders.constFind(folder);
-    if (known == m_folders.constEnd()) {
-        remember(folder, FolderWalk::ListFolder(folder).files);
-        known = m_folders.constFind(folder);
+    const QStringList* names = &m_walked.names;
+    if (folder != m_walked.path) {
+        auto known = m_folders.constFind(folder);
+        if (known == m_folders.constEnd())
+            known = m_folders.insert(folder, sideFilesAmong(FolderWalk::ListFolder(folder).files));
+        names = &*known;
     }
-    const QString match = matchName(*known, name);
+    const QString match = matchName(*names, name);
     return match.isEmpty() ? QString() : folder + match;
 }
 
