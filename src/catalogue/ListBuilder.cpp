@@ -10,6 +10,7 @@
 #include "icons/cFileIcon.h"
 #include "store/InfoFiles.h"
 #include "support/PathFunctions.h"
+#include "support/ReadOnlyFile.h"
 #include "support/TextCase.h"
 
 namespace Brimvault {
@@ -29,14 +30,16 @@ struct IconPicture {
     QImage picture;
 };
 
-IconPicture pictureOf(const QString& iconFile, bool decodeLater)
+IconPicture pictureOf(const QString& iconFile, bool decodeLater, const OpenFolder* folder = nullptr)
 {
     // LoadIcon reads only a regular file: a named pipe in the icon's place cannot block the window.
     if (iconFile.isEmpty())
         return {};
     try {
         cFileIcon icon;
-        if (!icon.LoadIcon(FileSystemPath(iconFile)))
+        const bool loaded
+            = folder ? icon.LoadIcon(FileSystemPath(iconFile), *folder) : icon.LoadIcon(FileSystemPath(iconFile));
+        if (!loaded)
             return {};
         if (decodeLater && icon.ScreenPictureIsSound())
             return {true, {}};
@@ -53,17 +56,21 @@ ListBuilder::ListBuilder(const QString& iconsFolder)
     : m_iconsFolder(iconsFolder)
 { }
 
+ListBuilder::~ListBuilder() = default;
+
 void ListBuilder::beginPass()
 {
     m_addedGames.read();
     m_languageTag = modLocalizer::ShortLanguageName();
     m_knownPaths.clear();
     m_sideFiles.clear();
+    m_openIconsFolder = std::make_unique<OpenFolder>(FileSystemPath(m_iconsFolder));
 }
 
 void ListBuilder::endPass()
 {
     m_sideFiles.clear();
+    m_openIconsFolder.reset();
 }
 
 QImage ListBuilder::ShownPicture(const QString& iconFile)
@@ -112,7 +119,7 @@ void ListBuilder::chooseIcon(GameEntry& entry) const
         = m_sideFiles.find(GetFileFolder(entry.path, false), GetFileName(entry.path, false) + QLatin1String(".ico"));
     const bool hasOwnIcon = !ownIcon.isEmpty();
     const QString candidate = hasOwnIcon ? ownIcon : IconCacheFile(m_iconsFolder, entry.path);
-    IconPicture found = pictureOf(candidate, true);
+    IconPicture found = pictureOf(candidate, true, hasOwnIcon ? nullptr : m_openIconsFolder.get());
     if (found.usable) {
         entry.source = hasOwnIcon ? IconSource::File : IconSource::Cache;
         entry.iconFile = candidate;

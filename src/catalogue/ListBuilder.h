@@ -7,13 +7,18 @@
 #include <QSet>
 #include <QString>
 
+#include <memory>
+
 namespace Brimvault {
+
+class OpenFolder;
 
 // Turns the path of one game into one list item: its caption and its picture, or the decision to queue it
 // for the icon cache builder. Keeps the known paths of the list for the duplicate tests.
 class ListBuilder {
 public:
     explicit ListBuilder(const QString& iconsFolder);
+    ~ListBuilder();
 
     // A new list: reads the added games, their user names and the language tag once, forgets the known paths.
     void beginPass();
@@ -51,6 +56,8 @@ private:
     AddedGamesSnapshot m_addedGames;
     QSet<QString> m_knownPaths;
     mutable SideFiles m_sideFiles;
+    // The cached icons' folder, held open for the pass: thousands of icons are opened in it by name.
+    std::unique_ptr<OpenFolder> m_openIconsFolder;
     bool m_keepPictures = true;
 };
 

@@ -90,11 +90,22 @@ void cFileIcon::reset(const QString& sFileName)
 
 bool cFileIcon::LoadIcon(const QString& sFileName)
 {
+    // A folder or a named pipe in the icon's place is refused, not waited on.
+    ReadOnlyFile file(sFileName);
+    return loadFrom(sFileName, file);
+}
+
+bool cFileIcon::LoadIcon(const QString& sFileName, const OpenFolder& folder)
+{
+    ReadOnlyFile file(sFileName, folder);
+    return loadFrom(sFileName, file);
+}
+
+bool cFileIcon::loadFrom(const QString& sFileName, ReadOnlyFile& file)
+{
     reset(sFileName);
     m_lastLoadMessage.clear();
     // One read takes in the whole of a usual icon file; images beyond it are read on their own.
-    // A folder or a named pipe in the icon's place is refused, not waited on.
-    ReadOnlyFile file(sFileName);
     const qint64 fileSize = file.size();
     QByteArray bytes;
     const auto readUpTo = [&](qint64 end) {

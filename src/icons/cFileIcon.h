@@ -11,7 +11,9 @@ class QScreen;
 
 namespace Brimvault {
 
+class OpenFolder;
 class PeModule;
+class ReadOnlyFile;
 
 // One directory entry of an icon file, as the file stores it.
 struct IconDirEntry {
@@ -38,6 +40,8 @@ public:
     cFileIcon() = default;
 
     bool LoadIcon(const QString& sFileName);
+    // The same for a file that may lie in a folder held open.
+    bool LoadIcon(const QString& sFileName, const OpenFolder& folder);
     bool SaveIcon(const QString& sFileName = QString());
     void CloneTo(cFileIcon& target) const;
 
@@ -89,6 +93,7 @@ public:
 
 private:
     void reset(const QString& sFileName);
+    bool loadFrom(const QString& sFileName, ReadOnlyFile& file);
     bool loadGroup(const PeModule& module, int lID, const QString& sName);
     void checkIndex(int nIndex) const;
     // Bits per pixel of an image, from its colour count (32 for true colour).

@@ -7,6 +7,26 @@
 
 namespace Brimvault {
 
+// A folder held open while many files in it are read: each is then opened by its name alone, so the system
+// walks one path part instead of the whole path (the list reads ten thousand icons from one folder).
+class OpenFolder {
+public:
+    // A folder that cannot be opened still serves: its files are then opened by their whole paths.
+    explicit OpenFolder(const QString& path);
+    ~OpenFolder();
+    OpenFolder(const OpenFolder&) = delete;
+    OpenFolder& operator=(const OpenFolder&) = delete;
+
+    const QString& path() const { return m_path; }
+
+private:
+    friend class ReadOnlyFile;
+    QString m_path;
+#ifndef Q_OS_WIN
+    int m_descriptor = -1;
+#endif
+};
+
 // A file opened for reading with as few system calls as a plain read takes: the list reads an info file and
 // an icon for every game, so each look-up saved is saved ten thousand times. Anything but a regular file (a
 // folder, a named pipe, a device) is refused without being waited on.
@@ -19,6 +39,8 @@ public:
     };
 
     explicit ReadOnlyFile(const QString& path);
+    // The same, opened by name within `folder` when the path lies directly in it.
+    ReadOnlyFile(const QString& path, const OpenFolder& folder);
     ~ReadOnlyFile();
     ReadOnlyFile(const ReadOnlyFile&) = delete;
     ReadOnlyFile& operator=(const ReadOnlyFile&) = delete;
@@ -32,6 +54,9 @@ public:
     bool failed() const { return m_failed; }
 
 private:
+#ifndef Q_OS_WIN
+    void take(int descriptor);
+#endif
 #ifdef Q_OS_WIN
     struct Handle;
     std::unique_ptr<Handle> m_handle;

@@ -9,13 +9,46 @@
 
 namespace Brimvault {
 
+namespace {
+
+// Without O_NONBLOCK, opening a named pipe would wait for a writer that may never come.
+constexpr int ReadFlags = O_RDONLY | O_CLOEXEC | O_NONBLOCK;
+
+} // namespace
+
+OpenFolder::OpenFolder(const QString& path)
+    : m_path(path)
+{
+    if (!path.isEmpty())
+        m_descriptor = ::open(path.toUtf8().constData(), O_PATH | O_DIRECTORY | O_CLOEXEC);
+}
+
+OpenFolder::~OpenFolder()
+{
+    if (m_descriptor >= 0)
+        ::close(m_descriptor);
+}
+
 ReadOnlyFile::ReadOnlyFile(const QString& path)
 {
-    if (path.isEmpty())
-        return;
-    // Without O_NONBLOCK, opening a named pipe would wait for a writer that may never come.
     // File names are UTF-8 here, and the plain encoder is much quicker than the locale's.
-    const int descriptor = ::open(path.toUtf8().constData(), O_RDONLY | O_CLOEXEC | O_NONBLOCK);
+    if (!path.isEmpty())
+        take(::open(path.toUtf8().constData(), ReadFlags));
+}
+
+ReadOnlyFile::ReadOnlyFile(const QString& path, const OpenFolder& folder)
+{
+    const QStringView name = QStringView(path).sliced(qMin(path.size(), folder.path().size()));
+    const bool inFolder = folder.m_descriptor >= 0 && !name.isEmpty() && path.startsWith(folder.path())
+        && folder.path().endsWith(u'/') && !name.contains(u'/');
+    if (inFolder)
+        take(::openat(folder.m_descriptor, name.toUtf8().constData(), ReadFlags));
+    else if (!path.isEmpty())
+        take(::open(path.toUtf8().constData(), ReadFlags));
+}
+
+void ReadOnlyFile::take(int descriptor)
+{
     if (descriptor < 0) {
         m_state = (errno == ENOENT || errno == ENOTDIR) ? State::Missing : State::NotReadable;
         return;

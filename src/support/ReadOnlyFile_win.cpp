@@ -30,7 +30,17 @@ ReadOnlyFile::ReadOnlyFile(const QString& path)
     m_state = State::Open;
 }
 
+ReadOnlyFile::ReadOnlyFile(const QString& path, const OpenFolder&)
+    : ReadOnlyFile(path)
+{ }
+
 ReadOnlyFile::~ReadOnlyFile() = default;
+
+OpenFolder::OpenFolder(const QString& path)
+    : m_path(path)
+{ }
+
+OpenFolder::~OpenFolder() = default;
 
 QByteArray ReadOnlyFile::readAt(qint64 offset, qint64 count)
 {
