@@ -39,6 +39,92 @@ QString withSeparator(const QString& folder)
     return folder + NativeSeparator();
 }
 
+// A folder's listing, and on Linux the folder still open until this goes, so that the walk opens the
+// folders below it by name: the system then walks one path part instead of the whole path.
+struct OpenedListing {
+    Listing listing;
+    int descriptor = -1;
+
+    explicit OpenedListing(const QString& folder, const OpenedListing* parent = nullptr, const QString& name = {});
+    ~OpenedListing();
+    OpenedListing(const OpenedListing&) = delete;
+    OpenedListing& operator=(const OpenedListing&) = delete;
+};
+
+OpenedListing::OpenedListing(const QString& folder, const OpenedListing* parent, const QString& name)
+{
+    if (folder.isEmpty())
+        return;
+#ifdef Q_OS_WIN
+    Q_UNUSED(parent)
+    Q_UNUSED(name)
+    QDirIterator it(folder, QDir::AllEntries | QDir::NoDotAndDotDot);
+    while (it.hasNext()) {
+        it.next();
+        const QFileInfo info = it.fileInfo();
+        (info.isDir() ? listing.folders : listing.files).append(info.fileName());
+    }
+#else
+    // A name with a backslash is opened by the whole path, where backslashes separate as they do elsewhere.
+    const bool byName = parent && parent->descriptor >= 0 && !name.isEmpty() && !name.contains(u'\\');
+    descriptor = byName ? ::openat(parent->descriptor, name.toUtf8().constData(), O_RDONLY | O_DIRECTORY | O_CLOEXEC)
+                        : ::open(QFile::encodeName(withSeparator(FileSystemPath(folder))).constData(),
+                            O_RDONLY | O_DIRECTORY | O_CLOEXEC);
+    if (descriptor < 0)
+        return;
+    struct stat status { };
+    if (::fstat(descriptor, &status) == 0)
+        listing.identity = qMakePair(quint64(status.st_dev), quint64(status.st_ino));
+    const auto take = [&](const char* entryName, unsigned char type) {
+        // Dot entries are the hidden ones here, "." and ".." among them.
+        if (entryName[0] == '.')
+            return;
+        bool isDir = type == DT_DIR;
+        bool isFile = type == DT_REG;
+        if (type == DT_UNKNOWN || type == DT_LNK) {
+            struct stat entryStatus { };
+            if (::fstatat(descriptor, entryName, &entryStatus, 0) == 0) {
+                isDir = S_ISDIR(entryStatus.st_mode);
+                isFile = S_ISREG(entryStatus.st_mode);
+            }
+        }
+        // File names are UTF-8 here; the plain decoder is many times quicker than the locale's on a short name.
+        if (isDir)
+            listing.folders.append(QString::fromUtf8(entryName, qstrlen(entryName)));
+        else if (isFile)
+            listing.files.append(QString::fromUtf8(entryName, qstrlen(entryName)));
+    };
+#ifdef Q_OS_LINUX
+    // The entries are read straight into a buffer of our own: a walk lists every folder of a large library,
+    // and a directory stream would cost a further system call and a large allocation for each.
+    alignas(dirent64) char buffer[32 * 1024];
+    ssize_t got = 0;
+    while ((got = ::getdents64(descriptor, buffer, sizeof buffer)) > 0) {
+        for (ssize_t at = 0; at < got;) {
+            const auto* entry = reinterpret_cast<const dirent64*>(buffer + at);
+            take(entry->d_name, entry->d_type);
+            at += entry->d_reclen;
+        }
+    }
+#else
+    // The stream reads through its own duplicate, so that this descriptor stays open for the folders below.
+    if (DIR* dir = ::fdopendir(::dup(descriptor))) {
+        while (const dirent* entry = ::readdir(dir))
+            take(entry->d_name, entry->d_type);
+        ::closedir(dir);
+    }
+#endif
+#endif
+}
+
+OpenedListing::~OpenedListing()
+{
+#ifndef Q_OS_WIN
+    if (descriptor >= 0)
+        ::close(descriptor);
+#endif
+}
+
 // A folder reached twice (a link back up the tree) is not walked again, and very deep trees end.
 constexpr int MaximumDepth = 256;
 
@@ -87,15 +173,18 @@ void settle(qsizetype ownIndex, WalkState& state)
     handSettled(state);
 }
 
-// ownIndex is the folder's place in the result, -1 for the root, which the caller keeps itself.
-void collect(const QString& folder, qsizetype ownIndex, int depth, WalkState& state)
+// ownIndex is the folder's place in the result, -1 for the root, which the caller keeps itself; `parent` is
+// the folder above, still open, and `name` the folder's name in it.
+void collect(const QString& folder, qsizetype ownIndex, int depth, WalkState& state,
+    const OpenedListing* parent = nullptr, const QString& name = {})
 {
     if (state.stopped)
         return;
     // A folder too deep, or reached twice, keeps its place without a listing; it is listed when read.
     if (depth > MaximumDepth)
         return settle(ownIndex, state);
-    Listing listing = ListFolder(folder);
+    OpenedListing opened(folder, parent, name);
+    Listing& listing = opened.listing;
     if (!firstVisit(listing, state))
         return settle(ownIndex, state);
     const bool stop = isStopFolder(folder, listing);
@@ -107,8 +196,8 @@ void collect(const QString& folder, qsizetype ownIndex, int depth, WalkState& st
     const QChar separator = separatorOf(folder);
     const qsizetype first = state.result.size();
     if (!stop) {
-        for (const QString& name : std::as_const(listing.folders)) {
-            state.result.append({folder + name + separator, std::nullopt});
+        for (const QString& subfolder : std::as_const(listing.folders)) {
+            state.result.append({folder + subfolder + separator, std::nullopt});
             state.settled.append(false);
         }
     }
@@ -118,7 +207,7 @@ void collect(const QString& folder, qsizetype ownIndex, int depth, WalkState& st
     settle(ownIndex, state);
     for (qsizetype i = first; i < end && !state.stopped; ++i) {
         const QString child = state.result.at(i).path;
-        collect(child, i, depth + 1, state);
+        collect(child, i, depth + 1, state, &opened, listing.folders.at(i - first));
     }
 }
 
@@ -126,69 +215,7 @@ void collect(const QString& folder, qsizetype ownIndex, int depth, WalkState& st
 
 Listing ListFolder(const QString& folder)
 {
-    Listing listing;
-    if (folder.isEmpty())
-        return listing;
-#ifdef Q_OS_WIN
-    QDirIterator it(folder, QDir::AllEntries | QDir::NoDotAndDotDot);
-    while (it.hasNext()) {
-        it.next();
-        const QFileInfo info = it.fileInfo();
-        (info.isDir() ? listing.folders : listing.files).append(info.fileName());
-    }
-#else
-    const QByteArray base = QFile::encodeName(withSeparator(FileSystemPath(folder)));
-    const auto take = [&](const char* name, unsigned char type) {
-        // Dot entries are the hidden ones here, "." and ".." among them.
-        if (name[0] == '.')
-            return;
-        bool isDir = type == DT_DIR;
-        bool isFile = type == DT_REG;
-        if (type == DT_UNKNOWN || type == DT_LNK) {
-            struct stat status { };
-            if (::stat(QByteArray(base + name).constData(), &status) == 0) {
-                isDir = S_ISDIR(status.st_mode);
-                isFile = S_ISREG(status.st_mode);
-            }
-        }
-        // File names are UTF-8 here; the plain decoder is many times quicker than the locale's on a short name.
-        if (isDir)
-            listing.folders.append(QString::fromUtf8(name, qstrlen(name)));
-        else if (isFile)
-            listing.files.append(QString::fromUtf8(name, qstrlen(name)));
-    };
-#ifdef Q_OS_LINUX
-    // The entries are read straight into a buffer of our own: a walk lists every folder of a large library,
-    // and a directory stream would cost a further system call and a large allocation for each.
-    const int descriptor = ::open(base.constData(), O_RDONLY | O_DIRECTORY | O_CLOEXEC);
-    if (descriptor < 0)
-        return listing;
-    struct stat status { };
-    if (::fstat(descriptor, &status) == 0)
-        listing.identity = qMakePair(quint64(status.st_dev), quint64(status.st_ino));
-    alignas(dirent64) char buffer[32 * 1024];
-    ssize_t got = 0;
-    while ((got = ::getdents64(descriptor, buffer, sizeof buffer)) > 0) {
-        for (ssize_t at = 0; at < got;) {
-            const auto* entry = reinterpret_cast<const dirent64*>(buffer + at);
-            take(entry->d_name, entry->d_type);
-            at += entry->d_reclen;
-        }
-    }
-    ::close(descriptor);
-#else
-    DIR* dir = ::opendir(base.constData());
-    if (!dir)
-        return listing;
-    while (const dirent* entry = ::readdir(dir))
-        take(entry->d_name, entry->d_type);
-    struct stat status { };
-    if (::fstat(::dirfd(dir), &status) == 0)
-        listing.identity = qMakePair(quint64(status.st_dev), quint64(status.st_ino));
-    ::closedir(dir);
-#endif
-#endif
-    return listing;
+    return OpenedListing(folder).listing;
 }
 
 namespace {
