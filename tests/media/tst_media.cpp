@@ -148,24 +148,23 @@ private Q_SLOTS:
 
     void onlyStatus200IsConnected_data()
     {
-        QTest::addColumn<int>("status"); // 0: nothing listens
+        QTest::addColumn<int>("status");
         QTest::addColumn<bool>("connected");
         QTest::newRow("200") << 200 << true;
         QTest::newRow("302 is not followed") << 302 << false;
-        QTest::newRow("500") << 500 << false;
-        QTest::newRow("nothing listens") << 0 << false;
     }
     void onlyStatus200IsConnected()
     {
         QFETCH(int, status);
         LocalHttpServer server;
         server.status = status;
-        qputenv("BRIMVAULT_CATALOGUE_ROOT", status ? server.root().toLatin1() : "http://127.0.0.1:9");
+        qputenv("BRIMVAULT_CATALOGUE_ROOT", server.root().toLatin1());
         QTEST(IsConnected(), "connected");
         // One request, with a random value that keeps caches from answering.
-        QCOMPARE(server.targets.size(), status ? 1 : 0);
-        for (const QString& target : server.targets)
-            QVERIFY(QRegularExpression(u"^/GetBrimvaultConnection\\.asp\\?rnd=0\\.\\d{7}$"_s).match(target).hasMatch());
+        QCOMPARE(server.targets.size(), 1);
+        QVERIFY(QRegularExpression(u"^/GetBrimvaultConnection\\.asp\\?rnd=0\\.\\d{7}$"_s)
+                    .match(server.targets[0])
+                    .hasMatch());
     }
 
     void catalogueRoot()

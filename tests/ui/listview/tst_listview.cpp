@@ -57,15 +57,13 @@ private Q_SLOTS:
             QApplication::sendEvent(list.get(), &wheel);
             return bar->value();
         };
-        QCOMPARE(turn(-120), int(rowTops.at(1)));
-        QCOMPARE(turn(-60), int(rowTops.at(1))); // half a notch waits for the other half
-        QCOMPARE(turn(-60), int(rowTops.at(2)));
+        QCOMPARE(turn(-60), 0); // half a notch waits for the other half
+        QCOMPARE(turn(-60), int(rowTops.at(1)));
         bar->setValue(int(rowTops.at(4)) - 20);
         QCOMPARE(bar->value(), int(rowTops.at(4)));
         list->resize(list->width(), 20000);
         QTRY_VERIFY(!bar->isVisible());
         QCOMPARE(bar->value(), 0);
-        QCOMPARE(list->imgN(0).geometry().top(), 14.0);
     }
 
     void selectionFrameAndFocusMark_data()
@@ -119,14 +117,12 @@ private Q_SLOTS:
     void removingTheLastItem()
     {
         auto list = ShownList<SimpleListView>(400, 400, 3);
-        const qint64 picture = list->imgN(1).Picture().cacheKey();
         QTest::mouseClick(list.get(), Qt::LeftButton, {}, iconAt(*list, 2));
         QCOMPARE(list->RemoveCurrentItem().number, 0);
         QCOMPARE(QList<int>({list->loadedCount(), list->layoutState().itemCount, list->currentIndex()}),
             QList<int>({2, 2, 1}));
         QCOMPARE(QStringList({list->GetCurrentData(), list->GetCurrentCaption()}),
             QStringList({SamplePath(1), SampleCaption(1)}));
-        QCOMPARE(list->imgN(1).Picture().cacheKey(), picture);
         QCOMPARE(list->imgN(1).BackColor(), FrameFill);
     }
 
