@@ -111,7 +111,6 @@ private Q_SLOTS:
         QTest::newRow("php with query is no page") << u"game.php?id=3"_s << MediaKind::StillPicture;
         QTest::newRow("substring ht") << u"a.ht"_s << MediaKind::WebPage;
         QTest::newRow("flash") << u"C:\\Games\\Foo.SWF"_s << MediaKind::FlashMovie;
-        QTest::newRow("png") << u"Image_1.png"_s << MediaKind::StillPicture;
         QTest::newRow("no extension") << u"C:\\ads\\Image"_s << MediaKind::StillPicture;
     }
     void mediaKind()

@@ -113,7 +113,7 @@ private Q_SLOTS:
         QCOMPARE(QList<int>({list->currentIndex(), list->vbarWindow()->value()}), QList<int>({0, 0}));
     }
 
-    // The last game goes: the one before it becomes current, with its own picture.
+    // The last game goes: the one before it becomes current and takes the frame.
     void removingTheLastItem()
     {
         auto list = ShownList<SimpleListView>(400, 400, 3);

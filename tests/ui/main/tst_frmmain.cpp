@@ -220,7 +220,6 @@ private Q_SLOTS:
         QCOMPARE(message, QStringLiteral("Version " BRIMVAULT_VERSION));
     }
 
-    // One game goes; the rest stay where they were, with no rebuild.
     void removingOneGameKeepsTheRest()
     {
         BuildSampleLibrary(*m_env);
