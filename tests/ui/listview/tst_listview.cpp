@@ -174,15 +174,13 @@ private Q_SLOTS:
         list->Refresh();
         QScrollBar* bar = list->vbarWindow();
         bar->setValue(int(list->layoutState().rowTops.at(60)));
-        for (int index : {180, 181, 182, 183}) {
-            QTest::mouseClick(list.get(), Qt::LeftButton, {}, iconAt(*list, index));
-            QCOMPARE(list->currentIndex(), index);
-        }
+        QTest::mouseClick(list.get(), Qt::LeftButton, {}, iconAt(*list, 183));
         // A caption that grew taller than a band is found at its far end, while the grid stays as it was.
         const qreal nextRow = list->imgN(186).geometry().top();
         list->SetCurrentCaption(u"word "_s.repeated(60));
         QCOMPARE(list->imgN(186).geometry().top(), nextRow);
         QTest::mouseClick(list.get(), Qt::LeftButton, {}, iconAt(*list, 181));
+        QCOMPARE(list->currentIndex(), 181);
         const QRectF grown = list->labN(183).geometry();
         QVERIFY(grown.height() > 300);
         QTest::mouseClick(list.get(), Qt::LeftButton, {}, QPoint(int(grown.left()) + 2, int(grown.bottom()) - 2));
