@@ -99,9 +99,7 @@ private Q_SLOTS:
         using enum ReclamaSchedule::UnloadMode;
         QCOMPARE(QDir(DataFolders::ReclamaFolder()), QDir(m_env.path(u"commonappdata/Brimvault/Reclama"_s)));
         QVERIFY(WriteDueAdvertisement(DataFolders::ReclamaFolder(), u"http://ads/today"_s, Qt::green));
-        const auto shown = ReclamaSchedule::ReclamaToShow(FormCode);
-        QCOMPARE(QFileInfo(shown->filePath).fileName() + u' ' + shown->address, u"Image_summer.png http://ads/today"_s);
-        QVERIFY(ReclamaSchedule::ReclamaToShow(FormControlMenu));
+        QVERIFY(ReclamaSchedule::ReclamaToShow(FormCode) && ReclamaSchedule::ReclamaToShow(FormControlMenu));
         QVERIFY(!ReclamaSchedule::ReclamaToShow(AppWindows) && !ReclamaSchedule::ReclamaToShow(AppTaskManager));
     }
 
@@ -113,7 +111,6 @@ private Q_SLOTS:
         QTest::newRow("php with query is no page") << u"game.php?id=3"_s << MediaKind::StillPicture;
         QTest::newRow("substring ht") << u"a.ht"_s << MediaKind::WebPage;
         QTest::newRow("flash") << u"C:\\Games\\Foo.SWF"_s << MediaKind::FlashMovie;
-        QTest::newRow("png") << u"Image_1.png"_s << MediaKind::StillPicture;
         QTest::newRow("no extension") << u"C:\\ads\\Image"_s << MediaKind::StillPicture;
     }
     void mediaKind()
@@ -148,24 +145,23 @@ private Q_SLOTS:
 
     void onlyStatus200IsConnected_data()
     {
-        QTest::addColumn<int>("status"); // 0: nothing listens
+        QTest::addColumn<int>("status");
         QTest::addColumn<bool>("connected");
         QTest::newRow("200") << 200 << true;
         QTest::newRow("302 is not followed") << 302 << false;
-        QTest::newRow("500") << 500 << false;
-        QTest::newRow("nothing listens") << 0 << false;
     }
     void onlyStatus200IsConnected()
     {
         QFETCH(int, status);
         LocalHttpServer server;
         server.status = status;
-        qputenv("BRIMVAULT_CATALOGUE_ROOT", status ? server.root().toLatin1() : "http://127.0.0.1:9");
+        qputenv("BRIMVAULT_CATALOGUE_ROOT", server.root().toLatin1());
         QTEST(IsConnected(), "connected");
         // One request, with a random value that keeps caches from answering.
-        QCOMPARE(server.targets.size(), status ? 1 : 0);
-        for (const QString& target : server.targets)
-            QVERIFY(QRegularExpression(u"^/GetBrimvaultConnection\\.asp\\?rnd=0\\.\\d{7}$"_s).match(target).hasMatch());
+        QCOMPARE(server.targets.size(), 1);
+        QVERIFY(QRegularExpression(u"^/GetBrimvaultConnection\\.asp\\?rnd=0\\.\\d{7}$"_s)
+                    .match(server.targets[0])
+                    .hasMatch());
     }
 
     void catalogueRoot()

@@ -101,7 +101,6 @@ private Q_SLOTS:
         QVERIFY(!shown->isVisible());
     }
 
-    // A screen reader finds the Actions button by its caption and presses it.
     void actionsButtonIsNamedAndPressable()
     {
         QAccessibleInterface* button = QAccessible::queryAccessibleInterface(m_window->imgActions());
