@@ -14,16 +14,6 @@
 using namespace Brimvault;
 using namespace Qt::StringLiterals;
 
-QString ProgramPath()
-{
-    return QStringLiteral(BRIMVAULT_BIN_DIR "/brimvault");
-}
-
-QString ServicePath()
-{
-    return QStringLiteral(BRIMVAULT_BIN_DIR "/BrimvaultService");
-}
-
 namespace {
 
 bool copyInto(const QString& source, const QString& folder)
@@ -85,12 +75,11 @@ QString ProgramOutcome::describe() const
     QStringList texts;
     for (const QJsonObject& prompt : prompts)
         texts.append(prompt.value(u"text"_s).toString());
-    return u"finished=%1 crashed=%2 exit=%3\nprompts: %4\nwindow: %5\nstderr: %6"_s.arg(finished)
+    const QByteArray shown = window ? QJsonDocument(*window).toJson(QJsonDocument::Compact) : "-";
+    return u"exit=%1 finished=%2 crashed=%3\nprompts: %4\nwindow: %5\nstderr: %6"_s.arg(exitCode)
+        .arg(finished)
         .arg(crashed)
-        .arg(exitCode)
-        .arg(texts.join(u" | "_s),
-            window ? QString::fromUtf8(QJsonDocument(*window).toJson(QJsonDocument::Compact)) : u"-"_s,
-            standardError.right(2000));
+        .arg(texts.join(u" | "_s), QString::fromUtf8(shown), standardError.right(2000));
 }
 
 ProgramOutcome RunProgram(

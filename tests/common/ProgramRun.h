@@ -10,8 +10,14 @@
 
 class TestEnvironment;
 
-QString ProgramPath();
-QString ServicePath();
+inline QString ProgramPath()
+{
+    return QStringLiteral(BRIMVAULT_BIN_DIR "/brimvault");
+}
+inline QString ServicePath()
+{
+    return QStringLiteral(BRIMVAULT_BIN_DIR "/BrimvaultService");
+}
 
 // A program folder of its own (BRIMVAULT_PROGRAM_DIR) holding copies of what ships beside the program: the
 // five components, the service and the language files, so that a test may damage any of them.

@@ -1,7 +1,6 @@
 // Start-up: the command line, the message and input boxes (as widgets and as the prompt log that lets tests watch
 // the real program), and the five components checked in order, registered when needed, their versions stored.
 #include "MainWindowFixture.h"
-#include "ProgramRun.h"
 #include "PromptRecorder.h"
 #include "TestEnvironment.h"
 #include "TestFiles.h"
@@ -327,15 +326,6 @@ private Q_SLOTS:
         QCOMPARE(savedVersion(u"Quillet"_s), installed.isNull() ? u"-"_s : installed);
         QTEST(stampOf(env.settingsFile()) != settingsBefore, "written");
         QCOMPARE(stampOf(ComponentRegistryPath()), registryBefore);
-    }
-
-    // Without a program folder named, the program finds its components beside itself: a missing one would stop
-    // start-up before the window.
-    void realProgramFindsItsComponents()
-    {
-        TestEnvironment env;
-        const ProgramOutcome outcome = RunProgram(env, QString());
-        QVERIFY2(outcome.showedWindow(), qPrintable(outcome.describe()));
     }
 };
 
