@@ -88,32 +88,28 @@ QString SamplePath(int i)
 
 QString BuildSampleLibrary(const TestEnvironment& environment)
 {
-    // folder, file title, English name, Russian name, icon colour
-    const char* const games[][5] = {
-        {"Lines", "lines", "Color Lines", "Цветные линии", "#dc3c3c"},
-        {"Mahjong", "mahjong", "Mahjong Garden", "Сад маджонга", "#28965a"},
-        {"Chess 3D", "chess3d", "Chess 3D", "Шахматы 3D", "#3c3c46"},
-    };
     const QString gamesFolder = environment.path(u"commonappdata/Brimvault/"_s);
     const auto writeIconFile = [](const QString& path, const QColor& color) {
         QDir().mkpath(QFileInfo(path).absolutePath());
         GamePicture(color).toImage().convertToFormat(QImage::Format_ARGB32).save(path, "ICO");
     };
+    // file, English name, Russian name, icon colour (beside the game, or "cache:" in the icon cache)
+    const char* const games[][4] = {{"Lines/lines.exe", "Color Lines", "Цветные линии", "#dc3c3c"},
+        {"Mahjong/mahjong.exe", "Mahjong Garden", "Сад маджонга", "#28965a"},
+        {"Chess 3D/chess3d.exe", "Chess 3D", "Шахматы 3D", "#3c3c46"}, {"Snake/snake.exe", "", "", ""},
+        {"Happy Farm/happyfarm.exe", "Happy Farm", "Весёлая ферма", "cache:#6eb428"},
+        {"Bubbles/bubbles.swf", "Bubble Shooter", "Стрелок шариками", ""}};
     for (const auto& game : games) {
-        const QString stem = gamesFolder + QString::fromUtf8(game[0]) + u'/' + QString::fromUtf8(game[1]);
-        WriteFile(stem + u".exe"_s);
-        WriteGameInfo(stem + u".exe"_s, QString::fromUtf8(game[2]), QString::fromUtf8(game[3]));
-        writeIconFile(stem + u".ico"_s, QColor(QString::fromLatin1(game[4])));
+        const QString path = gamesFolder + QString::fromUtf8(game[0]);
+        const QString colour = QString::fromLatin1(game[3]);
+        WriteFile(path, path.endsWith(u".swf") ? "FWS" : "MZ");
+        if (*game[1])
+            WriteGameInfo(path, QString::fromUtf8(game[1]), QString::fromUtf8(game[2]));
+        if (colour.startsWith(u"cache:"))
+            writeIconFile(IconCacheFile(gamesFolder + u"Icons/"_s, path), QColor(colour.mid(6)));
+        else if (!colour.isEmpty())
+            writeIconFile(path.chopped(4) + u".ico"_s, QColor(colour));
     }
-    WriteFile(gamesFolder + u"Snake/snake.exe"_s);
-    const QString cached = gamesFolder + u"Happy Farm/happyfarm.exe"_s;
-    WriteFile(cached);
-    WriteGameInfo(cached, u"Happy Farm"_s, u"Весёлая ферма"_s);
-    writeIconFile(IconCacheFile(gamesFolder + u"Icons/"_s, cached), QColor(110, 180, 40));
-    const QString movie = gamesFolder + u"Bubbles/bubbles.swf"_s;
-    WriteFile(movie, "FWS");
-    WriteGameInfo(movie, u"Bubble Shooter"_s, u"Стрелок шариками"_s);
-
     const QString added = environment.path(u"personal/Puzzles/puzzle.exe"_s);
     WriteFile(added);
     writeIconFile(environment.path(u"personal/Puzzles/puzzle.ico"_s), QColor(230, 200, 40));

@@ -1,8 +1,5 @@
 #include "MovieFiles.h"
 
-#include "TestFiles.h"
-
-#include <QColor>
 #include <QString>
 
 namespace {
@@ -65,13 +62,4 @@ QByteArray SwfBuilder::externalCall(const QString& function, int stacked)
 QByteArray SwfBuilder::getUrl(const QByteArray& url, const QByteArray& target)
 {
     return action('\x83', url + '\0' + target + '\0');
-}
-
-bool WriteFlashMovie(const QString& path, const QColor& background)
-{
-    SwfBuilder movie;
-    const char rgb[] = {char(background.red()), char(background.green()), char(background.blue())};
-    movie.addTag(9, QByteArray(rgb, 3));
-    movie.showFrame();
-    return WriteFile(path, movie.bytes());
 }

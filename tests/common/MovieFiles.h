@@ -2,7 +2,6 @@
 
 #include <QByteArray>
 
-class QColor;
 class QString;
 
 // Small uncompressed Flash movies written byte by byte: a 640 x 480 stage at 24 frames a second, then tags.
@@ -23,6 +22,3 @@ private:
     quint16 m_frames = 0;
     QByteArray m_tags;
 };
-
-// A one-frame movie that shows nothing but its background colour.
-bool WriteFlashMovie(const QString& path, const QColor& background);

@@ -46,10 +46,6 @@ class TestServiceInstall : public QObject {
         const QString script = QStringLiteral(BRIMVAULT_SOURCE_DIR "/tests/service/craft_package.py");
         return QProcess::execute(u"python3"_s, {script, kind, out}) == 0;
     }
-    QStringList gameFolders() const
-    {
-        return QDir(m_games).entryList(QDir::AllEntries | QDir::Hidden | QDir::NoDotAndDotDot);
-    }
     // A game folder "name" of the given files, packed by the service; "" when it refused.
     QString packGame(const QString& name, const QList<QPair<QString, QByteArray>>& files) const
     {
@@ -90,7 +86,8 @@ private Q_SLOTS:
         m_env.reset();
     }
 
-    // Refused before anything is written, the games folder included; the name rules are the validator's table.
+    // Refused before anything is written, the games folder included (or where a file blocks it); the name rules
+    // are the validator's table.
     void refused_data()
     {
         QTest::addColumn<QString>("kind");
@@ -108,6 +105,7 @@ private Q_SLOTS:
         QTest::newRow("bad checksum") << u"corrupt"_s << none << u"CRC"_s;
         QTest::newRow("size header lies") << u"liar"_s << none << u"larger than its header says"_s;
         QTest::newRow("missing package") << QString() << none << u"cannot be found"_s;
+        QTest::newRow("games folder is a file") << u"good"_s << none << u"cannot be created"_s;
     }
     void refused()
     {
@@ -117,7 +115,10 @@ private Q_SLOTS:
         for (qsizetype i = 0; i + 1 < settings.size(); i += 2)
             QVERIFY(SaveSetting(AppTitle(), CatalogueKeys::SettingsSection, settings.at(i), settings.at(i + 1)));
         const QString package = m_packages + u"/package.bvxpak"_s;
-        QVERIFY2(QDir(m_games).removeRecursively() && (kind.isEmpty() || craftPackage(kind, package)), "needs python3");
+        const bool blocked = reason == u"cannot be created";
+        QVERIFY2(QDir(m_games).removeRecursively() && (!blocked || WriteFile(m_games))
+                && (kind.isEmpty() || craftPackage(kind, package)),
+            "needs python3");
         const auto before = SnapshotTree(m_env->root());
         QString output;
         QCOMPARE(RunService({u"-I"_s, package}, &output), 1);
@@ -160,7 +161,7 @@ private Q_SLOTS:
                 qPrintable(errors));
             QCOMPARE(SnapshotTree(m_games + u'/' + names.at(i)), SnapshotTree(packages.at(i).chopped(7)));
         }
-        QCOMPARE(gameFolders(), names);
+        QCOMPARE(QDir(m_games).entryList(QDir::AllEntries | QDir::Hidden | QDir::NoDotAndDotDot), names);
         QCOMPARE(signal(), u"1"_s);
     }
 

@@ -13,12 +13,61 @@
 #include "store/SettingsStore.h"
 
 #include <QJsonArray>
+#include <QJsonDocument>
+#include <QProcess>
 #include <QtTest>
+
+#include <optional>
 
 using namespace Brimvault;
 using namespace Qt::StringLiterals;
 
 namespace {
+
+// What one run of the real program did: how it ended, the boxes it showed (its prompt log) and what its main
+// window showed once filled (its window report; none when no window opened).
+struct ProgramOutcome {
+    bool finished = false; // ended by itself within a minute
+    bool crashed = false;
+    int exitCode = -1;
+    QString standardError;
+    QList<QJsonObject> prompts;
+    std::optional<QJsonObject> window;
+
+    // The window opened visible, nothing was asked, and the program ended normally.
+    bool showedWindow() const
+    {
+        return finished && !crashed && exitCode == 0 && prompts.isEmpty() && window
+            && window->value(u"visible"_s).toBool();
+    }
+    // Start-up's one message, critical with OK and titled "Brimvault"; no window; exit code 1.
+    bool stoppedWithAdminMessage() const
+    {
+        const QJsonObject message {{u"kind"_s, u"message"_s},
+            {u"text"_s, u"You need to run the program as administrator!"_s}, {u"title"_s, u"Brimvault"_s},
+            {u"icon"_s, u"critical"_s}, {u"buttons"_s, u"ok"_s}};
+        return finished && !crashed && exitCode == 1 && !window && prompts == QList {message};
+    }
+    // One field ("data", "picture") of every list item, in list order.
+    QStringList items(const QString& field) const
+    {
+        QStringList values;
+        for (const QJsonValue& item : window.value_or(QJsonObject()).value(u"items"_s).toArray())
+            values.append(item.toObject().value(field).toString());
+        return values;
+    }
+    QString describe() const
+    {
+        QStringList texts;
+        for (const QJsonObject& prompt : prompts)
+            texts.append(prompt.value(u"text"_s).toString());
+        const QByteArray shown = window ? QJsonDocument(*window).toJson(QJsonDocument::Compact) : "-";
+        return u"exit=%1 finished=%2 crashed=%3\nprompts: %4\nwindow: %5\nstderr: %6"_s.arg(exitCode)
+            .arg(finished)
+            .arg(crashed)
+            .arg(texts.join(u" | "_s), QString::fromUtf8(shown), standardError.right(2000));
+    }
+};
 
 // The entry at path and everything below it, as SnapshotTree shows them.
 QMap<QString, QByteArray> snapshotOf(const QString& path)
@@ -44,11 +93,42 @@ class TestDamagedEnvironment : public QObject {
     Q_OBJECT
 
     std::unique_ptr<TestEnvironment> m_env;
-    std::unique_ptr<ProgramFolderCopy> m_program;
+    // A program folder of the test's own, holding copies of what ships beside the program to be damaged.
+    std::unique_ptr<QTemporaryDir> m_program;
 
+    // The real program without arguments, offscreen, with the prompt log and the window report switched on; a
+    // null value in changes removes that variable.
     ProgramOutcome run(const QMap<QString, QString>& changes = {})
     {
-        return RunProgram(*m_env, m_program->path(), changes);
+        const QString promptLog = m_env->path(u"prompts.jsonl"_s);
+        const QString windowReport = m_env->path(u"window.json"_s);
+        QFile::remove(promptLog);
+        QFile::remove(windowReport);
+        QMap<QString, QString> variables {{u"QT_QPA_PLATFORM"_s, u"offscreen"_s}, {u"BRIMVAULT_LOCALE"_s, u"en_US"_s},
+            {u"BRIMVAULT_PROGRAM_DIR"_s, m_program->path()}, {u"BRIMVAULT_PROMPT_LOG"_s, promptLog},
+            {u"BRIMVAULT_WINDOW_REPORT"_s, windowReport}};
+        variables.insert(changes);
+        QProcessEnvironment system = QProcessEnvironment::systemEnvironment();
+        for (auto it = variables.cbegin(); it != variables.cend(); ++it)
+            it->isNull() ? system.remove(it.key()) : system.insert(it.key(), it.value());
+        QProcess program;
+        program.setProcessEnvironment(system);
+        program.setWorkingDirectory(m_env->root());
+        program.start(ProgramPath(), {});
+        ProgramOutcome outcome;
+        outcome.finished = program.waitForFinished(60000);
+        if (!outcome.finished)
+            program.kill(), program.waitForFinished(10000);
+        outcome.crashed = outcome.finished && program.exitStatus() == QProcess::CrashExit;
+        outcome.exitCode = program.exitCode();
+        outcome.standardError = program.errorString() + u'\n' + QString::fromLocal8Bit(program.readAllStandardError());
+        for (const QByteArray& line : ReadFile(promptLog).split('\n')) {
+            if (!line.trimmed().isEmpty())
+                outcome.prompts.append(QJsonDocument::fromJson(line).object());
+        }
+        if (QFileInfo::exists(windowReport))
+            outcome.window = QJsonDocument::fromJson(ReadFile(windowReport)).object();
+        return outcome;
     }
 
     // Puts a damaged thing at path: "removed", "empty", "garbage", "text", "folder", "pipe", "link TARGET" (in
@@ -88,8 +168,16 @@ private Q_SLOTS:
     void init()
     {
         m_env = std::make_unique<TestEnvironment>();
-        m_program = std::make_unique<ProgramFolderCopy>();
-        QVERIFY(m_program->isValid() && !PeFixture(u"multi32.exe"_s).isEmpty());
+        m_program = std::make_unique<QTemporaryDir>();
+        QStringList shipped {ServicePath()};
+        for (const CompanionComponent& component : CompanionComponents())
+            shipped << QStringLiteral(BRIMVAULT_BIN_DIR "/") + component.fileName;
+        const QDir languages(QStringLiteral(BRIMVAULT_SOURCE_DIR "/lang"));
+        for (const QString& name : languages.entryList({u"*.lng"_s}, QDir::Files))
+            shipped << languages.filePath(name);
+        for (const QString& file : shipped)
+            QVERIFY2(QFile::copy(file, m_program->filePath(QFileInfo(file).fileName())), qPrintable(file));
+        QVERIFY(!PeFixture(u"multi32.exe"_s).isEmpty());
     }
     void cleanup()
     {
@@ -98,38 +186,28 @@ private Q_SLOTS:
     }
 
     // Unreadable settings: storing the first component's version fails, which start-up answers with its one
-    // message. Readable but damaged settings: the damaged lines are kept as they are and the program runs.
+    // message. Otherwise the program runs and keeps the user's bytes.
     void damagedSettingsFile_data()
     {
         QTest::addColumn<QString>("damaged"); // relative to the tree
         QTest::addColumn<QString>("damage");
-        QTest::addColumn<QByteArray>("before"); // written before and after the intact settings
-        QTest::addColumn<QByteArray>("after");
         QTest::addColumn<bool>("runs");
         const QString file = u"settings/Brimvault.ini"_s;
         const QString lock = u"settings/Brimvault.ini.lock"_s;
-        const QByteArray none;
-        QTest::newRow("named pipe in the file's place") << file << u"pipe"_s << none << none << false;
-        QTest::newRow("settings folder is a file") << u"settings"_s << u"text"_s << none << none << false;
-        QTest::newRow("folder in the lock file's place") << lock << u"folder"_s << none << none << false;
-        QTest::newRow("named pipe in the lock file's place") << lock << u"pipe"_s << none << none << true;
+        QTest::newRow("named pipe in the file's place") << file << u"pipe"_s << false;
+        QTest::newRow("settings folder is a file") << u"settings"_s << u"text"_s << false;
+        QTest::newRow("folder in the lock file's place") << lock << u"folder"_s << false;
+        QTest::newRow("named pipe in the lock file's place") << lock << u"pipe"_s << true;
         // Kept elsewhere by the user (a folder of dotfiles, say): written through, the link stays.
-        QTest::newRow("link to the user's own file")
-            << file << u"link personal/dotfiles/Brimvault.ini"_s << none << none << true;
-        // Random bytes (NULs, invalid UTF-8, line ends) before the sections; a 10 MB line and a cut-off one after.
-        QTest::newRow("garbage, long line, cut off")
-            << file << u"intact"_s << RandomBytes(64 * 1024, 20261121) + '\n'
-            << "; " + QByteArray(10 * 1024 * 1024, 'x') + "\n[LocaleSettings]\nLngFileN" << true;
+        QTest::newRow("link to the user's own file") << file << u"link personal/dotfiles/Brimvault.ini"_s << true;
     }
     void damagedSettingsFile()
     {
         QFETCH(QString, damaged);
         QFETCH(QString, damage);
-        QFETCH(QByteArray, before);
-        QFETCH(QByteArray, after);
         QFETCH(bool, runs);
         const QString game = userGame();
-        const QByteArray original = before + addedGameSettings(game) + after;
+        const QByteArray original = addedGameSettings(game);
         const QString settings = m_env->settingsFile();
         QVERIFY(WriteFile(settings, original) && WriteFile(m_env->path(u"personal/dotfiles/Brimvault.ini"_s), original)
             && spoil(m_env->path(damaged), damage));
@@ -169,8 +247,7 @@ private Q_SLOTS:
     }
 
     // A game whose file, folder or icon cache is damaged is still listed, and the damaged thing stays as it
-    // was. Every queued icon is made once, from the executable when the cache cannot be used; without a games
-    // folder, installing a package tells why it cannot be done.
+    // was. Icons are made from the executable when the cache cannot be used.
     void gamesDamaged_data()
     {
         QTest::addColumn<QString>("target"); // the game added by hand, its folders, the icons or Arcade's cache
@@ -185,23 +262,18 @@ private Q_SLOTS:
         QTest::newRow("cache file is a pipe") << u"cache"_s << u"pipe"_s;
         QTest::newRow("cache file is a folder") << u"cache"_s << u"folder"_s;
         QTest::newRow("cache file is a link") << u"cache"_s << u"link personal/notes.txt"_s;
-        QTest::newRow("cache file is garbage") << u"cache"_s << u"garbage"_s;
     }
     void gamesDamaged()
     {
         QFETCH(QString, target);
         QFETCH(QString, damage);
         const QString game = userGame();
-        const QString solitaire = m_env->path(u"windows/sol.exe"_s);
         const QString withIcon = DataFolders::GamesFolder() + u"Arcade/Arcade.exe"_s;
-        const QString withoutIcon = DataFolders::GamesFolder() + u"Plain/Plain.exe"_s;
-        const QString cacheFile = FileSystemPath(IconCacheFile(DataFolders::IconsFolder(), withIcon));
-        const QMap<QString, QString> targets {
-            {u"game"_s, game}, {u"cache"_s, cacheFile}, {u"icons"_s, QDir::cleanPath(DataFolders::IconsFolder())}};
+        const QMap<QString, QString> targets {{u"game"_s, game},
+            {u"cache"_s, FileSystemPath(IconCacheFile(DataFolders::IconsFolder(), withIcon))},
+            {u"icons"_s, QDir::cleanPath(DataFolders::IconsFolder())}};
         const QString damaged = targets.value(target, m_env->path(target));
         QVERIFY(WriteFile(withIcon, ReadFile(PeFixture(u"multi32.exe"_s)))
-            && WriteFile(withoutIcon, ReadFile(PeFixture(u"nores32.exe"_s)))
-            && QFile::copy(PeFixture(u"nores32.exe"_s), solitaire)
             && WriteFile(m_env->settingsFile(), addedGameSettings(game))
             && WriteFile(m_env->path(u"personal/notes.txt"_s), "my notes\n")
             && WriteFile(m_env->path(u"blocker"_s), "a file\n") && spoil(damaged, damage));
@@ -211,34 +283,15 @@ private Q_SLOTS:
 
         const ProgramOutcome outcome = run();
 
-        VERIFY_OUTCOME(outcome.showedWindow(), outcome);
+        // The online games, the game added by hand and, with a usable games folder, Arcade.
         const QStringList data = outcome.items(u"data"_s);
         const QStringList pictures = outcome.items(u"picture"_s);
-        VERIFY_OUTCOME(data.size() == (gamesFolder ? 5 : 3) && data.first().startsWith(u"http://127.0.0.1:9/"_s)
-                && data.contains(solitaire),
-            outcome);
+        VERIFY_OUTCOME(outcome.showedWindow() && data.size() == (gamesFolder ? 3 : 2), outcome);
         QCOMPARE(pictures.value(data.indexOf(game)), u"no-icon"_s);
-        QCOMPARE(outcome.items(u"caption"_s).value(data.indexOf(game)), u"chess"_s);
-        if (target == u"cache" && damage == u"garbage")
-            QVERIFY(ReadFile(cacheFile).startsWith(QByteArray("\0\0\1\0", 4)));
-        else
-            QCOMPARE(snapshotOf(damaged), untouched);
-        QCOMPARE(SnapshotTree(m_env->path(u"personal"_s)), personal);
-        if (gamesFolder) {
-            QCOMPARE(pictures.value(data.indexOf(withIcon)), u"picture"_s);
-            QCOMPARE(pictures.value(data.indexOf(withoutIcon)), u"no-icon"_s);
-            QVERIFY(!QFileInfo::exists(FileSystemPath(IconCacheFile(DataFolders::IconsFolder(), withoutIcon))));
-            return;
-        }
-        const QString source = m_env->path(u"sources/Star Quest"_s);
-        const QString package = m_env->path(u"StarQuest.bvxpak"_s);
-        QString output;
-        QVERIFY(WriteFile(source + u"/StarQuest.exe"_s, ReadFile(PeFixture(u"multi32.exe"_s))));
-        QCOMPARE(RunService({u"--pack"_s, source, package}, &output), 0);
-        QVERIFY2(
-            RunService({u"-I"_s, package}, &output) > 0 && output.contains(u"cannot be created"_s), qPrintable(output));
         QCOMPARE(snapshotOf(damaged), untouched);
-        QCOMPARE(GetSetting(AppTitle(), u"Commands"_s, u"NewGameInstalled"_s, u"0"_s), u"0"_s);
+        QCOMPARE(SnapshotTree(m_env->path(u"personal"_s)), personal);
+        if (gamesFolder)
+            QCOMPARE(pictures.value(data.indexOf(withIcon)), u"picture"_s);
     }
 
     // The stored language applies when its file is usable; otherwise the built-in English texts, silently, and
