@@ -2,12 +2,12 @@
 // floor of that path: the same host window loading a plain local page.
 #include "BenchReport.h"
 #include "MovieFiles.h"
+#include "TestFiles.h"
 
 #include "media/WebEngineStartup.h"
 #include "media/frmReclama.h"
 
 #include <QApplication>
-#include <QColor>
 #include <QDeadlineTimer>
 #include <QDir>
 #include <QElapsedTimer>
@@ -96,8 +96,11 @@ int main(int argc, char* argv[])
 
     const QString movie = QDir(root.path()).filePath(QStringLiteral("movie.swf"));
     const QString page = QDir(root.path()).filePath(QStringLiteral("page.html"));
+    SwfBuilder oneFrame;
+    oneFrame.addTag(9, QByteArrayLiteral("\x20\x40\x60")); // a background colour and nothing else
+    oneFrame.showFrame();
     QFile pageFile(page);
-    if (!WriteFlashMovie(movie, QColor(0x20, 0x40, 0x60)) || !pageFile.open(QIODevice::WriteOnly))
+    if (!WriteFile(movie, oneFrame.bytes()) || !pageFile.open(QIODevice::WriteOnly))
         return 1;
     pageFile.write("<!DOCTYPE html><html><body><p id=\"ready\">ready</p></body></html>");
     pageFile.close();
