@@ -411,8 +411,6 @@ private Q_SLOTS:
                                          << u"My Hearts"_s;
         QTest::newRow("info file before zone table")
             << caption(u"hrtzzm.exe"_s, {}, {}, "<>Name<Info Hearts") << u"Info Hearts"_s;
-        QTest::newRow("info file of another language only")
-            << caption(u"game.exe"_s, {}, {}, "<>Name_RUS<Igra") << u"game"_s;
         QTest::newRow("zone member without row falls to version")
             << caption(u"zm.exe"_s, u"pe/multi64.exe"_s) << u"Marble Cascade"_s;
         QTest::newRow("long version text trimmed, cut and broken")
@@ -435,44 +433,19 @@ private Q_SLOTS:
         QTEST(actual, "expected");
     }
 
-    void buildIcon_data()
-    {
-        QTest::addColumn<QString>("fixture");
-        QTest::addColumn<bool>("dataFolderExists");
-        QTest::addColumn<Outcome>("outcome");
-        QTest::addColumn<bool>("cached");
-        QTest::newRow("64-bit with icon") << u"multi64.exe"_s << true << Outcome::Extracted << true;
-        QTest::newRow("cache folder's parent missing") << u"multi64.exe"_s << false << Outcome::Extracted << false;
-        QTest::newRow("without icon") << u"nores64.exe"_s << true << Outcome::NoIcon << false;
-    }
-    void buildIcon()
-    {
-        QFETCH(QString, fixture);
-        QFETCH(bool, dataFolderExists);
-        QFETCH(Outcome, outcome);
-        QFETCH(bool, cached);
-        REQUIRE_PE(fixture, game());
-        if (dataFolderExists)
-            QVERIFY(QDir().mkpath(m_env->path(u"commonappdata/Brimvault"_s)));
-        const IconCacheBuilder::Result result = IconCacheBuilder(DataFolders::IconsFolder()).BuildIcon(game());
-        QCOMPARE(result.outcome, outcome);
-        QCOMPARE(result.picture.isNull(), outcome == Outcome::NoIcon);
-        QCOMPARE(result.cacheFile, cacheOf(game()));
-        QCOMPARE(result.saved && QFileInfo::exists(result.cacheFile), cached);
-        QCOMPARE(QFileInfo::exists(m_env->path(u"commonappdata/Brimvault"_s)), dataFolderExists);
-    }
-
     // Closing stops the work before the next game; a damaged cache file is replaced, a good one is used as it is
-    // even when the game changed.
+    // even when the game changed. Without the data folder an icon is shown, yet neither cached nor the folder made.
     void onePerTick()
     {
-        QVERIFY(QDir().mkpath(DataFolders::GamesFolder()));
         const QStringList games {game(u"one.exe"_s), game(u"two.exe"_s)};
         IconCacheBuilder builder(DataFolders::IconsFolder());
         for (qsizetype i = 0; i < games.size(); ++i) {
             REQUIRE_PE(u"multi64.exe"_s, games.at(i));
             builder.enqueue(games.at(i), quint64(100 + i));
         }
+        const IconCacheBuilder::Result uncached = builder.BuildIcon(games.at(0));
+        QVERIFY(uncached.outcome == Outcome::Extracted && !uncached.saved && !uncached.picture.isNull());
+        QVERIFY(!QFileInfo::exists(DataFolders::GamesFolder()));
         QVERIFY(WriteFile(cacheOf(games.at(0)), QByteArray("\0\0\1\0\1\0", 6)));
         QVERIFY(!builder.Tick(true) && builder.pending() == 2);
         const auto first = builder.Tick(false);
@@ -486,6 +459,9 @@ private Q_SLOTS:
         const IconCacheBuilder::Result cached = builder.BuildIcon(games.at(0));
         QVERIFY(cached.outcome == Outcome::FromCache && !cached.saved);
         QCOMPARE(cached.picture, first->result.picture);
+        REQUIRE_PE(u"nores64.exe"_s, game(u"none.exe"_s));
+        const IconCacheBuilder::Result none = builder.BuildIcon(game(u"none.exe"_s));
+        QVERIFY(none.outcome == Outcome::NoIcon && none.picture.isNull() && !none.saved);
     }
 
     // The program's --list and --json output, read as a user's script would.
@@ -507,10 +483,8 @@ private Q_SLOTS:
         QCOMPARE(jsonExit, 0);
         QCOMPARE(SnapshotTree(m_env->root()), before);
         QStringList items;
-        for (const QJsonValue& value : QJsonDocument::fromJson(json).array()) {
-            QCOMPARE(value.toObject().size(), 6);
+        for (const QJsonValue& value : QJsonDocument::fromJson(json).array())
             items.append(value[u"caption"_s].toString() + u'\t' + value[u"icon"_s].toString());
-        }
         QCOMPARE(items,
             QStringList({u"Online games\tonline"_s, u"movie\tflash"_s, u"Marble Everywhere\tqueued"_s, u"sol\tqueued"_s,
                 u"Renamed\tqueued"_s, u"Internet Chervi\tqueued"_s}));
