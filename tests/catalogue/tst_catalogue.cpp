@@ -190,7 +190,8 @@ private Q_SLOTS:
     }
 
     // Added games in key order, trimmed; one matching an installed game loosely is not listed twice, a
-    // missing file is listed all the same. Then the classic games after the installed ones.
+    // missing file is listed all the same. Then the classic games after the installed ones, the pinball from the
+    // first drive from C: holding it.
     void addedAndClassicGames()
     {
         const QString installed = games(u"inst/game.exe"_s);
@@ -198,6 +199,8 @@ private Q_SLOTS:
         QVERIFY(write(u"windows/"_s,
             {u"sol.exe"_s, u"system32/sol.exe"_s, u"system32/winmine.exe"_s, u"spider.exe"_s,
                 u"system32/notepad.exe"_s}));
+        const QString pinball = u"/Program Files/Windows NT/Pinball/PINBALL.exe"_s;
+        QVERIFY(write(u"wine/dosdevices/"_s, {u"e:"_s + pinball, u"d:"_s + pinball, u"b:"_s + pinball}));
         QVERIFY(WriteFile(installed) && WriteFile(added));
         QVERIFY(WriteFile(m_env->settingsFile(),
             QString(u"[Files]\nCount=9\nFile1=  "_s + installed.toLower() + u" \nFile2= "_s + added + u"  \nFile3="_s
@@ -206,8 +209,9 @@ private Q_SLOTS:
         const Run run = discover();
         QCOMPARE(run.paths,
             QStringList({installed, path(u"windows/spider.exe"_s), path(u"windows/sol.exe"_s),
-                path(u"windows/system32/winmine.exe"_s), added, added, path(u"missing.exe"_s)}));
-        QCOMPARE(run.entries.at(7).caption, u"missing"_s);
+                path(u"windows/system32/winmine.exe"_s), path(u"wine/dosdevices/d:"_s) + pinball, added, added,
+                path(u"missing.exe"_s)}));
+        QCOMPARE(run.entries.at(8).caption, u"missing"_s);
     }
 
     void microsoftGamesFolder_data()
@@ -242,13 +246,6 @@ private Q_SLOTS:
         QCOMPARE(run.paths,
             found ? QStringList({folder + u"/hrtzzm.exe"_s, folder + u"/Chess/Chess.exe"_s}) : QStringList());
         QVERIFY(!found || run.entries.at(1).caption == u"Internet Chervi"_s);
-    }
-
-    void pinballFromTheFirstDrive()
-    {
-        const QString pinball = u"/Program Files/Windows NT/Pinball/PINBALL.exe"_s;
-        QVERIFY(write(u"wine/dosdevices/"_s, {u"e:"_s + pinball, u"d:"_s + pinball, u"b:"_s + pinball}));
-        QCOMPARE(discover().paths, QStringList({path(u"wine/dosdevices/d:"_s) + pinball}));
     }
 
     void stopFlag_data()
