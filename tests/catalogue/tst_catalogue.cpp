@@ -346,16 +346,14 @@ private Q_SLOTS:
     {
         QTest::addColumn<QString>("actual");
         QTest::addColumn<QString>("expected");
-        // A game file (plain, or a copy of a built fixture: pe/<name> or catalogue/<name>) with a user's name and
-        // an info file. The user's name belongs to the entry whose path matches after trimming and in any case;
-        // of a name key written twice by hand the first counts.
+        // A game file (plain, or a copy of a built fixture) with a user's name and an info file. The user's name
+        // belongs to the entry whose path matches after trimming and in any case; of a name key written twice by
+        // hand the first counts.
         const auto caption = [](const QString& fileName, const QString& fixture, const QByteArray& userName = {},
                                  const QByteArray& info = {}) -> QString {
             TestEnvironment env;
             const QString path = env.path(u"games/"_s + fileName);
-            const QString built
-                = fixture.startsWith(u"pe/") ? PeFixture(fixture.mid(3)) : CatalogueFixture(fixture.mid(10));
-            if (fixture.isEmpty() ? !WriteFile(path) : !CopyFixture(built, path))
+            if (fixture.isEmpty() ? !WriteFile(path) : !CopyFixture(fixture, path))
                 return u"missing the executable fixtures (mingw-w64): build them with make test"_s;
             if (!info.isEmpty())
                 WriteFile(path.chopped(4) + u".BVXINF"_s, info);
@@ -409,11 +407,11 @@ private Q_SLOTS:
         QTest::newRow("info file before zone table")
             << caption(u"hrtzzm.exe"_s, {}, {}, "<>Name<Info Hearts") << u"Info Hearts"_s;
         QTest::newRow("zone member without row falls to version")
-            << caption(u"zm.exe"_s, u"pe/multi64.exe"_s) << u"Marble Cascade"_s;
+            << caption(u"zm.exe"_s, PeFixture(u"multi64.exe"_s)) << u"Marble Cascade"_s;
         QTest::newRow("long version text trimmed, cut and broken")
-            << caption(u"long.exe"_s, u"catalogue/long_desc.exe"_s) << u"SuperMegaUlt raExtremeHyp erDelu..."_s;
+            << caption(u"long.exe"_s, CatalogueFixture(u"long_desc.exe"_s)) << u"SuperMegaUlt raExtremeHyp erDelu..."_s;
         QTest::newRow("version without description")
-            << caption(u"nodesc.exe"_s, u"pe/ver_nodesc64.exe"_s) << u"nodesc"_s;
+            << caption(u"nodesc.exe"_s, PeFixture(u"ver_nodesc64.exe"_s)) << u"nodesc"_s;
         QTest::newRow("user name is tidied too")
             << caption(u"g.exe"_s, {}, u"Исполняемый файл для игры Шашки"_s.toUtf8()) << u"Шашки"_s;
         QTest::newRow("own icon wins over cache") << icon(u"a.exe"_s, 'v', 'v') << u"file 32 own"_s;
