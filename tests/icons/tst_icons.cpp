@@ -666,9 +666,6 @@ private Q_SLOTS:
         QCOMPARE(QString::fromUtf8(process.readAllStandardOutput()),
             u"Translation=041904E3\nCompanyName=Студия Пример\nFileDescription=Весёлые шарики\nFileVersion=2.0.0.1\n"
             "InternalName=\nLegalCopyright=\nOriginalFileName=\nProductName=Шарики\nProductVersion=\n"_s);
-        QCOMPARE(run({u"--version-info"_s, PeFixture(u"nores64.exe"_s)}), 1);
-        QCOMPARE(process.readAllStandardError(),
-            (PeFixture(u"nores64.exe"_s) + u": no version information could be read\n"_s).toUtf8());
         QCOMPARE(run({u"--extract-icon"_s, PeFixture(u"multi64.exe"_s), m_env.path(u"no/folder/out.ico"_s)}), 1);
         QCOMPARE(process.readAllStandardError(),
             (m_env.path(u"no/folder/out.ico"_s) + u": Couldn't open file for writing.\n"_s).toUtf8());
