@@ -175,7 +175,6 @@ private Q_SLOTS:
         QTest::newRow("lookup ignores case") << lookup(u"<>Ads<v"_s, u"<>ADS<"_s) << u"<>Ads<v|v"_s;
         QTest::newRow("lookup, middle line") << lookup(u"<>b<1\r\n<>a<2\r\n<>c<3"_s, a) << u"<>a<2|2"_s;
         QTest::newRow("lookup, longer key first") << lookup(u"<>a<>>x<1\r\n<>a<2"_s, a) << u"<>a<>>x<1|1"_s;
-        QTest::newRow("lookup anywhere in a line") << lookup(u"junk<>a<v"_s, a) << u"junk<>a<v|v"_s;
         QTest::newRow("lookup, empty value") << lookup(a, a) << u"<>a<|dflt"_s;
         QTest::newRow("lookup, missing") << lookup(u"<>b<1"_s, a) << u"|dflt"_s;
         QTest::newRow("lookup, lone LF joins lines") << lookup(u"<>a<1\n<>b<2"_s, a) << u"<>a<1\n<>b<2|2"_s;
@@ -364,7 +363,6 @@ private Q_SLOTS:
         QVERIFY(bag.SaveFile() && !bag.Changed());
         QCOMPARE(ReadFile(path), QByteArray("<>Name<\xd0\x98\xd0\xb3\xd1\x80\xd0\xb0\r\n<>Name_ENG<Game\\{NL}\\2"));
         QVERIFY(bag.RemoveRecord(u"<>name"_s, true));
-        QVERIFY(bag.SaveFile() && !QFile::exists(path));
         QVERIFY(bag.SaveFile() && !QFile::exists(path));
         bag.OpenFile(m_env->root() + u"\\win\\game.bvxinf"_s);
         bag.SetRecord(u"<>a<"_s, u"1"_s);

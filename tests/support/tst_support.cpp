@@ -208,22 +208,14 @@ private Q_SLOTS:
             QVERIFY(!QFile::exists(QStringLiteral("/proc/%1").arg(readPid())));
     }
 
-    // The limit is counted in polls of 500 ms, strictly exceeded; the process goes on afterwards.
-    void timeOutCountsPolls_data()
-    {
-        QTest::addColumn<int>("timeoutMs");
-        QTest::addColumn<int>("polls");
-        QTest::newRow("499 ms: after the first wait") << 499 << 1;
-        QTest::newRow("500 ms: after the second wait") << 500 << 2;
-    }
+    // The limit is counted in polls of 500 ms, strictly exceeded: 500 ms give up after the second wait. The
+    // process goes on afterwards.
     void timeOutCountsPolls()
     {
-        QFETCH(int, timeoutMs);
-        QFETCH(int, polls);
         QElapsedTimer clock;
         clock.start();
-        QCOMPARE(ShellAndWait(sleeper(20), timeoutMs, 0, 1), 2);
-        QVERIFY(clock.elapsed() >= polls * 500 - 50);
+        QCOMPARE(ShellAndWait(sleeper(20), 500, 0, 1), 2);
+        QVERIFY(clock.elapsed() >= 950);
         QTest::qSleep(100);
         killAfterCheckingAlive();
     }
@@ -284,11 +276,10 @@ private Q_SLOTS:
         QCOMPARE(result, expected);
         QCOMPARE(prompts.texts(),
             breakAction == 2 ? QStringList {u"User Process Break.\r\nContinue to wait?"_qs} : QStringList());
-        if (breakAction == 2) {
-            QCOMPARE(prompts.prompts[0].title, u"Brimvault"_qs);
-            QCOMPARE(prompts.prompts[0].buttons, PromptButtons::YesNo);
-            QCOMPARE(prompts.prompts[0].icon, PromptIcon::None);
-        }
+        const PromptRequest& asked = prompts.prompts.value(0);
+        QVERIFY(breakAction != 2
+            || (asked.title == u"Brimvault" && asked.buttons == PromptButtons::YesNo
+                && asked.icon == PromptIcon::None));
         if (expected != 0)
             killAfterCheckingAlive();
     }
