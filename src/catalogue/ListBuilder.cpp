@@ -119,7 +119,7 @@ void ListBuilder::chooseIcon(GameEntry& entry) const
         = m_sideFiles.find(GetFileFolder(entry.path, false), GetFileName(entry.path, false) + QLatin1String(".ico"));
     const bool hasOwnIcon = !ownIcon.isEmpty();
     const QString candidate = hasOwnIcon ? ownIcon : IconCacheFile(m_iconsFolder, entry.path);
-    IconPicture found = pictureOf(candidate, true, hasOwnIcon ? nullptr : m_openIconsFolder.get());
+    IconPicture found = pictureOf(candidate, true, m_openIconsFolder.get());
     if (found.usable) {
         entry.source = hasOwnIcon ? IconSource::File : IconSource::Cache;
         entry.iconFile = candidate;

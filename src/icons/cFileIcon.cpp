@@ -133,8 +133,9 @@ bool cFileIcon::loadFrom(const QString& sFileName, ReadOnlyFile& file)
 
     bool failed = false;
     readUpTo(IconHeaderSize + IconDirEntrySize * m_idCount);
-    m_entries.reserve(qMin<qsizetype>(m_idCount, (bytes.size() - IconHeaderSize) / IconDirEntrySize));
-    m_images.reserve(m_entries.capacity());
+    const qsizetype entriesRead = qMin<qsizetype>(m_idCount, (bytes.size() - IconHeaderSize) / IconDirEntrySize);
+    m_entries.reserve(entriesRead);
+    m_images.reserve(entriesRead);
     // The images read with the directory stay where they are: each refers into these bytes, not a copy.
     m_fileBytes = bytes;
     for (int i = 0; i < m_idCount; ++i) {

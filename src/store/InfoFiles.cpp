@@ -43,10 +43,8 @@ InfoFileParts GameInfoFileParts(const QString& gamePath)
     const QStringView name = path.sliced(separator + 1);
     const qsizetype dot = name.lastIndexOf(u'.');
     const QStringView title = dot < 0 ? name : name.left(dot);
-    QString fileName;
-    fileName.reserve(title.size() + CatalogueKeys::InfoFileExtension.size());
-    fileName.append(title).append(CatalogueKeys::InfoFileExtension);
-    return {separator < 0 ? QStringLiteral(".\\") : path.left(separator + 1).toString(), fileName};
+    return {separator < 0 ? QStringLiteral(".\\") : path.left(separator + 1).toString(),
+        title % CatalogueKeys::InfoFileExtension};
 }
 
 QString GameInfoFileName(const QString& gamePath)

@@ -54,13 +54,11 @@ public:
     bool failed() const { return m_failed; }
 
 private:
-#ifndef Q_OS_WIN
-    void take(int descriptor);
-#endif
 #ifdef Q_OS_WIN
     struct Handle;
     std::unique_ptr<Handle> m_handle;
 #else
+    void take(int descriptor);
     int m_descriptor = -1; // a plain descriptor: no allocation for each of the list's many files
 #endif
     State m_state = State::Missing;
